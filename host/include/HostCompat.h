@@ -4,8 +4,9 @@
 #include <strings.h>
 
 #ifndef _MSC_VER
-// A 64-bit signed integer under the name that the exported interface uses for file positions and lengths.
-typedef long long __int64;
+// A 64-bit integer under the name that the exported interface uses for file positions and lengths. A macro, not a
+// typedef, so that "unsigned __int64" works as it does where the name is built in.
+#define __int64 long long
 
 // Case-insensitive comparisons (ASCII), as the format's identifiers need them.
 inline int _stricmp(const char* a, const char* b) { return strcasecmp(a, b); }

@@ -16,8 +16,8 @@ public:
     void setOffset(__int64 offset) { m_offset = offset; }
     void setLength(__int64 length) { m_length = length; }
 
-    // Reads the bytes into `buffer` and appends a line feed and a NUL, so `buffer` must hold length + 2 bytes.
-    // Bytes beyond the end of the file read as zeros.
+    // Reads the bytes into `buffer` and appends a line feed and a NUL, so `buffer` must hold length + 2
+    // bytes. Bytes beyond the end of the file read as zeros.
     void readData(FILE* fp, char* buffer) const;
 
 private:

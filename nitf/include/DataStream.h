@@ -19,8 +19,8 @@ public:
     // Bytes between the stream's position and the end of the file (0 when it cannot be told).
     static __int64 remaining(FILE* fp);
 
-    // Raises vexo::Exception when `length` bytes cannot be read at the stream's position: the guard in front of
-    // every allocation whose size comes from the file.
+    // Raises vexo::Exception when `length` bytes cannot be read at the stream's position: the guard in front
+    // of every allocation whose size comes from the file.
     static void requireReadable(FILE* fp, __int64 length, const char* what);
 
 protected:

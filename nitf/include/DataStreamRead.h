@@ -14,13 +14,13 @@ public:
     float readFloat();
     double readDouble();
 
-    // New buffers from HMalloc: `length` bytes, or `length` bytes and a NUL. Bytes past the end of the file read
-    // as zeros; a length the rest of the file cannot hold raises vexo::Exception.
+    // New buffers from HMalloc: `length` bytes, or `length` bytes and a NUL. Bytes past the end of the file
+    // read as zeros; a length the rest of the file cannot hold raises vexo::Exception.
     char* readBytes(int length);
     char* readText(int length);
 
-    // Decimal fields: `width` characters converted like atoi / ScanInt64. A width of 32 or more reads nothing and
-    // gives 0: no field of the format is that wide.
+    // Decimal fields: `width` characters converted like atoi / ScanInt64. A width of 32 or more reads nothing
+    // and gives 0: no field of the format is that wide.
     int readDecimal(int width);
     __int64 readDecimal64(int width);
 

@@ -7,8 +7,8 @@ class CDataStreamWrite : public CDataStream {
 public:
     explicit CDataStreamWrite(FILE* fp, bool swap = true) : CDataStream(fp, swap) {}
 
-    // Right-justified in `width`, filled on the left with '0' (zeroFill) or blanks; fill goes before a minus sign
-    // and a value wider than `width` is not cut.
+    // Right-justified in `width`, filled on the left with '0' (zeroFill) or blanks; fill goes before a minus
+    // sign and a value wider than `width` is not cut.
     void writeDecimal(int value, int width, bool zeroFill);
     void writeDecimal64(__int64 value, int width, bool zeroFill);
     // Cut to `width`, then blanks up to `width`.

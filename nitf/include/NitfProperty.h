@@ -27,7 +27,8 @@ public:
     explicit CNitfProperty(const char* text);
     ~CNitfProperty();
 
-    // Copies the three members as they stand: a text buffer is shared, not duplicated. Callers never destroy both.
+    // Copies the three members as they stand: a text buffer is shared, not duplicated. Callers never destroy
+    // both.
     CNitfProperty& operator=(const CNitfProperty& other);
     CNitfProperty(const CNitfProperty& other);
 
@@ -77,11 +78,12 @@ public:
 
     static bool isBCSA(char c);
     static bool isBCSA(const char* text, int length);
-    // For the file background colour: true when the value holds the three binary colour bytes rather than text.
+    // For the file background colour: true when the value holds the three binary colour bytes rather than
+    // text.
     bool isFBKGC();
 
-    // Writes exactly `width` bytes: text left-justified and blank-filled, integers right-justified and zero-filled.
-    // Other kinds write nothing.
+    // Writes exactly `width` bytes: text left-justified and blank-filled, integers right-justified and
+    // zero-filled. Other kinds write nothing.
     void writeString(FILE* fp, int width);
     // Writes an eInt4 value's four bytes in host order (not swapped); other kinds write nothing.
     void writeInt4(FILE* fp);

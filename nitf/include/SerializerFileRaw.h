@@ -1,5 +1,5 @@
-// Binary values written and read as they are in memory, byte-reversed when the swapping flag is set (the file's
-// byte order differs from the host's: RPF files are big-endian).
+// Binary values written and read as they are in memory, byte-reversed when the swapping flag is set (the
+// file's byte order differs from the host's: RPF files are big-endian).
 #pragma once
 
 #include "SerializerFile.h"

@@ -1,4 +1,5 @@
-// Measures records without writing them: a running byte count, and the offset and length of registered objects.
+// Measures records without writing them: a running byte count, and the offset and length of registered
+// objects.
 #pragma once
 
 #include <map>
@@ -8,9 +9,9 @@
 namespace nitf {
 
 struct SerializerQueryInfo_t {
-    bool found;      // the object was serialized
-    __int64 length;  // bytes it produced
-    __int64 offset;  // running count when it began
+    bool found;     // the object was serialized
+    __int64 length; // bytes it produced
+    __int64 offset; // running count when it began
 };
 
 class CSerializerQuery : public CSerializer {

@@ -1,0 +1,5 @@
+#include "NitfVersion.h"
+
+const char* nitfVersion() {
+    return NITF_VERSION_TEXT;
+}

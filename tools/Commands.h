@@ -1,0 +1,4 @@
+// The tool's sub-commands; each takes the arguments after its name and returns the exit status.
+#pragma once
+
+int runSelfCheck(int argc, char** argv);

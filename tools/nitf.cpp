@@ -1,0 +1,35 @@
+// The nitf command-line tool: looks into NITF/NSIF files with the library.
+#include <cstdio>
+#include <cstring>
+#include <string>
+
+#include "Commands.h"
+#include "HostError.h"
+#include "NitfVersion.h"
+
+static int usage(FILE* out) {
+    std::fprintf(out, "usage: nitf --version\n"
+                      "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back\n");
+    return out == stdout ? 0 : 2;
+}
+
+int main(int argc, char** argv) {
+    if (argc < 2)
+        return usage(stderr);
+    std::string command = argv[1];
+    try {
+        if (command == "--version" || command == "version") {
+            std::printf("nitf %s\n", nitfVersion());
+            return 0;
+        }
+        if (command == "--help" || command == "help")
+            return usage(stdout);
+        if (command == "selfcheck")
+            return runSelfCheck(argc - 2, argv + 2);
+    } catch (const vexo::Exception& e) {
+        std::fprintf(stderr, "nitf: %s\n", e.what());
+        return 1;
+    }
+    std::fprintf(stderr, "nitf: unknown command '%s'\n", command.c_str());
+    return usage(stderr);
+}
