@@ -1,0 +1,66 @@
+#include "TestFiles.h"
+
+#include <cstdlib>
+#include <fstream>
+#include <sstream>
+#include <stdexcept>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include "HostFile.h"
+
+static bool isDirectory(const std::string& path) {
+    struct stat st;
+    return !path.empty() && stat(path.c_str(), &st) == 0 && S_ISDIR(st.st_mode);
+}
+
+TempFile::TempFile(const std::string& contents, const std::string& suffix) {
+    const char* dir = std::getenv("TMPDIR");
+    std::string pattern = std::string(dir && *dir ? dir : "/tmp") + "/nitf-test-XXXXXX" + suffix;
+    int fd = mkstemps(&pattern[0], static_cast<int>(suffix.size()));
+    if (fd < 0)
+        throw std::runtime_error("cannot create a temporary file");
+    close(fd);
+    m_path = pattern;
+    write(contents);
+}
+
+TempFile::~TempFile() {
+    std::remove(m_path.c_str());
+}
+
+void TempFile::write(const std::string& contents) const {
+    std::ofstream out(m_path, std::ios::binary | std::ios::trunc);
+    out.write(contents.data(), static_cast<std::streamsize>(contents.size()));
+    if (!out)
+        throw std::runtime_error("cannot write " + m_path);
+}
+
+std::string TempFile::read() const {
+    return readWholeFile(m_path);
+}
+
+ByteStream::ByteStream(const std::string& bytes) : m_file(bytes, ".bin") {
+    m_fp = DKOpen(m_file.path().c_str(), DK_READ | DK_WRITE | DK_BINARY | DK_EXISTING, "r+b");
+    if (!m_fp)
+        throw std::runtime_error("cannot open " + m_file.path());
+}
+
+ByteStream::~ByteStream() {
+    DKClose(m_fp);
+}
+
+std::string corpusRoot() {
+    const char* env = std::getenv("NITF_TEST_DATA");
+    if (env && *env)
+        return isDirectory(env) ? std::string(env) : std::string();
+    std::string beside = std::string(NITF_SOURCE_DIR) + "/../shared/testdata";
+    return isDirectory(beside) ? beside : std::string();
+}
+
+std::string readWholeFile(const std::string& path) {
+    std::ifstream in(path, std::ios::binary);
+    std::ostringstream contents;
+    contents << in.rdbuf();
+    return contents.str();
+}
