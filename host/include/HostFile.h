@@ -19,8 +19,10 @@ const int DK_MODE_READ_BINARY = DK_READ | DK_BINARY | DK_EXISTING;
 // The creator's mode: a new binary file open for reading and writing (2 | 4 | 8 | 16).
 const int DK_MODE_CREATE_BINARY = DK_WRITE | DK_READ | DK_BINARY | DK_CREATE;
 
-// Opens `name`. `access` is an fopen mode ("rb", "w+b", ...); when null or empty it is derived from `flags`.
-// Returns null when the file cannot be opened.
+// Opens `name`. `access` is an fopen mode ("rb", "w+b", ...); when null or empty it is derived from `flags`:
+// DK_CREATE gives "w" ("w+" with DK_READ); DK_WRITE keeps an existing file ("r+") and creates a missing one
+// unless DK_EXISTING is set; DK_READ alone gives "r"; DK_BINARY adds "b". So DK_MODE_READ_BINARY is "rb" and
+// DK_MODE_CREATE_BINARY is "w+b". Returns null when the file cannot be opened.
 FILE* DKOpen(const char* name, int flags, const char* access);
 int DKClose(FILE* fp);
 

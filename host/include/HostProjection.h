@@ -46,7 +46,10 @@ int GeocodedToMGRS(double latitude, double longitude, int precision, char* mgrs)
 int MGRSToGeocoded(const char* mgrs, double* latitude, double* longitude);
 
 // Sets the affine transform of `info` from four corners in its own system, for an image of `width` by `height`
-// pixels; returns 0 on success.
+// pixels, and keeps the corners in the record; returns 0 on success, -1 for a size below 1 or a non-finite corner.
+// As in IGEOLO, a corner is the centre of the corner pixel: UL is pixel (0, 0), UR (width-1, 0), LR
+// (width-1, height-1), LL (0, height-1). The transform is fitted to UL, UR and LL; an image one pixel wide (high)
+// gets a zero step along its columns (rows).
 int ProjSetGeoreferenceFromCorners(ProjInfo_t* info, const double cornerX[4], const double cornerY[4], int width,
                                    int height);
 

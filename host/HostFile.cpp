@@ -1,0 +1,126 @@
+// Default host file layer over C stdio. Positions go through fseeko/ftello with a 64-bit off_t so that files
+// beyond 4 GB work on every target, 32-bit ones included.
+#ifndef _FILE_OFFSET_BITS
+#define _FILE_OFFSET_BITS 64
+#endif
+
+#include "HostFile.h"
+
+#include <mutex>
+#include <string>
+#include <unordered_map>
+
+#include <sys/stat.h>
+#include <sys/types.h>
+
+static_assert(sizeof(off_t) == 8, "the host file layer needs a 64-bit off_t");
+
+namespace {
+
+// Names of the streams DKOpen opened, for fp2filename. Nodes of an unordered_map never move, so the text
+// handed out stays valid until its own stream is closed, whatever other threads open or close meanwhile.
+class StreamNames {
+public:
+    void add(FILE* fp, const char* name) {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        m_names[fp] = name;
+    }
+    void remove(FILE* fp) {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        m_names.erase(fp);
+    }
+    const char* find(FILE* fp) {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        auto it = m_names.find(fp);
+        return it == m_names.end() ? "" : it->second.c_str();
+    }
+
+private:
+    std::mutex m_mutex;
+    std::unordered_map<FILE*, std::string> m_names;
+};
+
+StreamNames& streamNames() {
+    static StreamNames names;
+    return names;
+}
+
+// The fopen mode for `flags`, as described at DKOpen; empty when the flags cannot be honoured.
+std::string modeFromFlags(const char* name, int flags) {
+    const bool exists = DKCheck(name);
+    if ((flags & DK_EXISTING) && !exists)
+        return "";
+    std::string mode;
+    if ((flags & DK_CREATE) || ((flags & DK_WRITE) && !exists))
+        mode = (flags & DK_READ) ? "w+" : "w";
+    else if (flags & DK_WRITE)
+        mode = "r+";
+    else if (flags & DK_READ)
+        mode = "r";
+    else
+        return "";
+    if (flags & DK_BINARY)
+        mode += 'b';
+    return mode;
+}
+
+} // namespace
+
+FILE* DKOpen(const char* name, int flags, const char* access) {
+    if (!name || !*name)
+        return nullptr;
+    std::string mode = (access && *access) ? std::string(access) : modeFromFlags(name, flags);
+    if (mode.empty())
+        return nullptr;
+    FILE* fp = std::fopen(name, mode.c_str());
+    if (fp)
+        streamNames().add(fp, name);
+    return fp;
+}
+
+int DKClose(FILE* fp) {
+    if (!fp)
+        return EOF;
+    streamNames().remove(fp);
+    return std::fclose(fp);
+}
+
+size_t DKFRead(void* buffer, size_t size, size_t count, FILE* fp) {
+    return (fp && buffer) ? std::fread(buffer, size, count, fp) : 0;
+}
+
+size_t DKFWrite(const void* buffer, size_t size, size_t count, FILE* fp) {
+    return (fp && buffer) ? std::fwrite(buffer, size, count, fp) : 0;
+}
+
+int DKFSeek(FILE* fp, long offset, int whence) {
+    return DKFSeek64(fp, offset, whence);
+}
+
+int DKFSeek64(FILE* fp, __int64 offset, int whence) {
+    return fp ? fseeko(fp, static_cast<off_t>(offset), whence) : -1;
+}
+
+__int64 DKFTell(FILE* fp) {
+    return fp ? static_cast<__int64>(ftello(fp)) : -1;
+}
+
+__int64 DKSize(FILE* fp) {
+    if (!fp)
+        return -1;
+    // Data still in the stream's buffer belongs to the file as the caller sees it.
+    std::fflush(fp);
+    struct stat info;
+    if (fstat(fileno(fp), &info) != 0)
+        return -1;
+    return static_cast<__int64>(info.st_size);
+}
+
+bool DKCheck(const char* name) {
+    struct stat info;
+    return name && *name && stat(name, &info) == 0 && !S_ISDIR(info.st_mode);
+}
+
+const char* fp2filename(FILE* fp) {
+    return fp ? streamNames().find(fp) : "";
+}
