@@ -120,8 +120,8 @@ __int64 ScanInt64(const char* text, int length) {
         magnitude = magnitude > (limit - digit) / 10 ? limit : magnitude * 10 + digit;
     }
     if (!negative)
-        return __int64(magnitude);
-    return magnitude == limit ? INT64_MIN : -__int64(magnitude);
+        return static_cast<__int64>(magnitude);
+    return magnitude == limit ? INT64_MIN : -static_cast<__int64>(magnitude);
 }
 
 char* LSCEatWS(char* text) {

@@ -56,9 +56,13 @@ public:
     // Text of exactly `length` bytes taken from `text` (which need not be terminated).
     void setString(const char* text, int length);
     void setCharsFromString(const char* text);
+    // Raw bytes (eChars) copied from `bytes`.
+    void setChars(const char* bytes, int length);
     void setInt4(int value);
 
     eDataType getDataType() const { return m_type; }
+    // The owned buffer of an eString or eChars value (null for other kinds); getLength() tells its size.
+    const char* getBytes() const { return m_type == eString || m_type == eChars ? m_value.text : nullptr; }
     float getFloat() const { return m_value.f; }
     double getDouble() const { return m_value.d; }
 

@@ -172,6 +172,12 @@ void CNitfProperty::setCharsFromString(const char* text) {
     m_type = eChars;
 }
 
+void CNitfProperty::setChars(const char* bytes, int length) {
+    setString(bytes, length);
+    m_count = length > 0 ? length : 0;
+    m_type = eChars;
+}
+
 void CNitfProperty::setInt4(int value) {
     release();
     m_value.integer = value;

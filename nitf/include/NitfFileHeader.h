@@ -1,0 +1,102 @@
+// What every version's file header has in common: version, field values, segment layout lists, file-level TREs.
+#pragma once
+
+#include <cstdio>
+#include <list>
+#include <vector>
+
+#include "NitfHeaderDataPair.h"
+#include "NitfProperty.h"
+#include "NitfTag.h"
+#include "NitfTypes.h"
+
+class CNitfFileReader;
+class CNitfImageSubheader;
+
+class CNitfFileHeader {
+public:
+    explicit CNitfFileHeader(eNitfVersion_t version);
+    virtual ~CNitfFileHeader();
+    CNitfFileHeader(const CNitfFileHeader&) = delete;
+    CNitfFileHeader& operator=(const CNitfFileHeader&) = delete;
+
+    // Reads the whole header from the stream's position (the start of the file).
+    virtual void read(FILE* fp, CNitfFileReader* reader) = 0;
+    virtual void write(FILE* fp) = 0;
+    // The header's length in bytes as it would be written now.
+    virtual __int64 computeStorageLength() = 0;
+    // Copies the file title into `title` (at least 81 bytes).
+    virtual void getTitle(char* title) = 0;
+    // A new image sub-header of this header's version for image `index`, read from the file; the caller owns it.
+    virtual CNitfImageSubheader* getNewImageSubheader(FILE* fp, int index) = 0;
+
+    // Reads nine bytes and maps them to a version; the stream is left after them.
+    static eNitfVersion_t readVersion(FILE* fp);
+
+    eNitfVersion_t getVersion() const { return m_version; }
+    PropertyMap& getProperties() { return m_properties; }
+    std::list<CNitfTag*>& getTaggedRecords() { return m_taggedRecords; }
+    bool getPropertiesModified() const { return m_propertiesModified; }
+    void setPropertiesModified() { m_propertiesModified = true; }
+    // The names of the fields read, in file order.
+    const std::vector<const char*>& getFieldNames() const { return m_fieldNames; }
+
+    int getImageCount() const { return static_cast<int>(m_images.size()); }
+    int getSymbolCount() const { return static_cast<int>(m_symbols.size()); }
+    int getLabelCount() const { return static_cast<int>(m_labels.size()); }
+    int getTextCount() const { return static_cast<int>(m_texts.size()); }
+    int getDataExtensionCount() const { return static_cast<int>(m_dataExtensions.size()); }
+    int getReservedExtensionCount() const { return static_cast<int>(m_reservedExtensions.size()); }
+
+    // The pair at a 0-based index, or null when the index is out of range.
+    CNitfHeaderDataPair* getImageHeaderDataPair(int index) { return pairAt(m_images, index); }
+    CNitfHeaderDataPair* getSymbolHeaderDataPair(int index) { return pairAt(m_symbols, index); }
+    CNitfHeaderDataPair* getLabelHeaderDataPair(int index) { return pairAt(m_labels, index); }
+    CNitfHeaderDataPair* getTextHeaderDataPair(int index) { return pairAt(m_texts, index); }
+    CNitfHeaderDataPair* getDataExtensionHeaderDataPair(int index) { return pairAt(m_dataExtensions, index); }
+    CNitfHeaderDataPair* getReservedExtensionHeaderDataPair(int index) {
+        return pairAt(m_reservedExtensions, index);
+    }
+
+    // Ownership passes to the header.
+    void addImageHeaderDataPair(CNitfHeaderDataPair* pair) { m_images.push_back(pair); }
+    void addTaggedRecord(CNitfTag* tag) { m_taggedRecords.push_back(tag); }
+
+    // Reads one segment table at the stream's position (its count field); returns the sum of its sub-header and
+    // data lengths. `fieldBytes` and `count` report the table's own size and entry count.
+    static __int64 readPairs(FILE* fp, __int64 firstOffset, int countWidth, int headerLengthWidth,
+                             int dataLengthWidth, std::vector<CNitfHeaderDataPair*>* list, __int64& fieldBytes,
+                             int& count);
+    static void writePairs(FILE* fp, int countWidth, int headerLengthWidth, int dataLengthWidth,
+                           std::vector<CNitfHeaderDataPair*>* list);
+
+    // The header's storage length plus the image segments (the other segment types are not counted).
+    __int64 computeFileLength();
+
+protected:
+    // Reads a TRE area (UDHD or XHD): its 5-digit length (stored under `lengthName`), the 3-digit overflow field
+    // (skipped), then the TREs.
+    void readTagArea(FILE* fp, const char* lengthName);
+    // Reads one counted field (NUMI, ...) as text and the segment table behind it; returns the segments' total.
+    __int64 readSegmentTable(FILE* fp, const char* countName, __int64 firstOffset, int headerLengthWidth,
+                             int dataLengthWidth, std::vector<CNitfHeaderDataPair*>* list);
+    void recordField(const char* name) { m_fieldNames.push_back(name); }
+    void clearContents();
+
+    std::vector<CNitfHeaderDataPair*> m_symbols;
+    std::vector<CNitfHeaderDataPair*> m_images;
+    std::vector<CNitfHeaderDataPair*> m_labels;
+    std::vector<CNitfHeaderDataPair*> m_texts;
+    std::vector<CNitfHeaderDataPair*> m_dataExtensions;
+    std::vector<CNitfHeaderDataPair*> m_reservedExtensions;
+    PropertyMap m_properties;
+    std::list<CNitfTag*> m_taggedRecords;
+    eNitfVersion_t m_version;
+    bool m_propertiesModified;
+    std::vector<const char*> m_fieldNames;
+
+private:
+    static CNitfHeaderDataPair* pairAt(std::vector<CNitfHeaderDataPair*>& list, int index) {
+        return index >= 0 && index < static_cast<int>(list.size()) ? list[index] : nullptr;
+    }
+};

@@ -1,0 +1,63 @@
+// The entry point for reading: opens a file, detects its version, reads its file header, and hands out new
+// objects for the segments asked for by index. Every object a getNew... call returns belongs to the caller.
+#pragma once
+
+#include <cstdio>
+
+#include "NitfFile.h"
+#include "NitfFileHeader.h"
+
+class CNitfImageSource;
+class CNitfSymbolSource;
+class CNitfLabelSource;
+class CNitfTextSource;
+class CNitfDataExtensionSource;
+class CNitfExtension;
+
+class CNitfFileReader : public CNitfFile {
+public:
+    CNitfFileReader();
+    ~CNitfFileReader() override;
+    CNitfFileReader(const CNitfFileReader&) = delete;
+    CNitfFileReader& operator=(const CNitfFileReader&) = delete;
+
+    // Opens the file read-only (binary) and, the first time, reads its header. Returns null, changing nothing,
+    // when the file cannot be opened; raises vexo::Exception for a file of unknown version. A reader keeps the
+    // header of the first file it opened.
+    FILE* open(const char* fileName, const char* access = "rb");
+    void close() override;
+    bool isOpen() const { return m_open; }
+
+    FILE* getInputStream() override { return m_fp; }
+    FILE* getOutputStream() override { return m_fp; }
+    CNitfFileHeader* getFileHeader() override { return m_header; }
+
+    int getImageCount() const;
+    int getSymbolCount() const;
+    int getLabelCount() const;
+    int getTextCount() const;
+    int getDataExtensionCount() const;
+
+    CNitfImageSource* getNewImageSource(int index);
+    CNitfSymbolSource* getNewSymbolSource(int index);
+    CNitfLabelSource* getNewLabelSource(int index);
+    CNitfTextSource* getNewTextSource(int index);
+    CNitfDataExtensionSource* getNewDataExtensionSource(int index);
+
+    bool hasExtensionRpf();
+    CNitfExtension* getNewExtensionPIAPRD();
+
+    // "<width>x<height> Pixels, <bits> Bits per Pixel" of image `index` into `text`.
+    void describeImageSource(int index, char* text);
+
+protected:
+    // The first file-level TRE named exactly `name`, or null; it stays owned by the header.
+    CNitfTag* getExtensionTag(const char* name);
+
+private:
+    CNitfFileHeader* getNewFileHeader();
+
+    bool m_open;
+    FILE* m_fp;
+    CNitfFileHeader* m_header;
+};

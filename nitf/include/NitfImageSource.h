@@ -1,0 +1,103 @@
+// The base of every image data source: one object per image segment that hands out (or takes) the image's pixels
+// block by block. It owns the blocking geometry, the block mask and pad pixel of masked images, the table of
+// block offsets, the interleaving conversions and the bridge to the host projection record.
+#pragma once
+
+#include <cstdio>
+
+#include "HostProjection.h"
+#include "NitfImagePropertiesIF.h"
+#include "NitfImageSubheader.h"
+
+class CNitfFile;
+
+class CNitfImageSource {
+public:
+    // Takes ownership of the sub-header; the file name is accepted and not used.
+    CNitfImageSource(CNitfImageSubheader* subheader, char* fileName);
+    CNitfImageSource(const CNitfImageSource&) = delete;
+    CNitfImageSource& operator=(const CNitfImageSource&) = delete;
+
+protected:
+    // Fills the tile offset table from the data offset and the block mask (null when unmasked).
+    virtual void prepareTileOffsets(FILE* fp, long long dataOffset, long long dataLength, unsigned int* blockMask,
+                                    int count) = 0;
+
+public:
+    virtual ~CNitfImageSource();
+    virtual __int64 computeStorageLength();
+    virtual bool validateParameters(FILE* fp);
+    virtual void readStart(FILE* fp, long long dataOffset, long long dataLength);
+    virtual void readProjection(FILE* fp, ProjInfo_t* info, bool flag);
+    // One whole block, pixel-interleaved, `rowBytes` apart.
+    virtual bool readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y) = 0;
+    // One band of one block, `rowBytes` apart.
+    virtual bool readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y, int band) = 0;
+    virtual bool readBitmap(char* buffer, int x0, int y0, int width, int srcRows, int outWidthBits, int outRows);
+    virtual void readFinish();
+    virtual void writeStart(FILE* fp, long long dataOffset, long long dataLength);
+    virtual bool isWriteable();
+    virtual void writeProjection(FILE* fp, ProjInfo_t* info);
+    virtual bool writeTileNonInterleaved(CNitfFile* file, char* buffer, int x, int y, int band);
+    virtual void writeFinish(FILE* fp);
+
+    // The block readers callers use: the row size is the image's own.
+    bool readTileInterleaved(CNitfFile* file, char* buffer, int x, int y);
+    // Reads band `band` of block (x, y); a failed or throwing read zero-fills the block and returns false.
+    bool readTileNonInterleaved(CNitfFile* file, char* buffer, int band, int x, int y);
+
+    // Reads the block mask record at the stream's position; returns its length in bytes.
+    int readBlockMask(FILE* fp);
+    __int64 computeBlockMaskStorageLength() const;
+    // The file offset of block entry `index` (0xFFFFFFFF: absent), or 0 before the table exists.
+    unsigned long long getTileOffset(int index) const;
+    bool hasPadPixel() const { return m_hasPadPixel; }
+    __int64 getPadPixelValue() const { return m_padPixelValue; }
+    void fillTileBlank(char* buffer, int rowStride);
+
+    int getDisplayLevel();
+    // Returns IDLVL as well, like getDisplayLevel: kept for callers that rely on it.
+    int getAttachmentLevel();
+    CNitfImagePropertiesIF::ePVType_t getPvtype();
+
+    CNitfImageSubheader* getImageSubheader() { return m_subheader; }
+    CNitfImagePropertiesIF& getImageProperties() { return m_properties; }
+    int getLutCount() { return m_subheader->getLutCount(); }
+    CNitfLutSource* getLutSource(int index) { return m_subheader->getLutSource(index); }
+    // "NITF Image error" whatever the code; released with free().
+    char* getErrorMessage(int code);
+
+    int GetChanIndex() const { return m_channelIndex; }
+    void SetChanIndex(int index) { m_channelIndex = index; }
+    void SetChanType(int type) { m_channelType = type; }
+    int getImageIndex() const { return m_imageIndex; }
+    void setImageIndex(int index) { m_imageIndex = index; }
+
+    // Interleaving conversions for byte-multiple sample sizes.
+    static void deinterleaveBandToPixel(char* dst, int dstRowStride, char* src, int rows, int cols, int bands,
+                                        int bitsPerPixel);
+    static void deinterleavePixelToBand(char* dst, int dstRowStride, char* src, int rows, int cols, int bands,
+                                        int bitsPerPixel, int band);
+    static void deinterleaveRowToBand(char* dst, int dstRowStride, char* src, int rows, int cols, int bands,
+                                      int bitsPerPixel, int band);
+
+protected:
+    // Number of entries in the block tables: blocks × bands for IMODE S, blocks for B, P, R, 0 otherwise.
+    int blockEntryCount() const;
+
+    CNitfImagePropertiesIF m_properties;
+    unsigned long long* m_tileOffsets;
+    unsigned int* m_blockMask;
+    int m_blockMaskCount;
+    CNitfImageSubheader* m_subheader;
+    char* m_workBuffer;
+    int m_workBufferSize;
+    int m_workBufferUsed;
+    __int64 m_padPixelValue;
+    bool m_hasPadPixel;
+    long long m_dataOffset;
+    long long m_dataLength;
+    int m_channelType;
+    int m_channelIndex;
+    int m_imageIndex;
+};

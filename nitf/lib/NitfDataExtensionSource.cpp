@@ -1,0 +1,179 @@
+#include "NitfDataExtensionSource.h"
+
+#include <cstring>
+#include <string>
+
+#include "DataStream.h"
+#include "FieldLayout.h"
+#include "HostFile.h"
+#include "HostMemory.h"
+#include "NitfFile.h"
+#include "NitfFileHeader.h"
+#include "NitfImageSource.h"
+#include "NitfSymbolSource.h"
+
+// Identifiers are compared in their stored, blank-padded form.
+static std::string padded(const char* text, size_t width) {
+    std::string value(text);
+    value.resize(width, ' ');
+    return value;
+}
+
+static bool fieldEquals(PropertyMap& map, const char* name, const char* value, size_t width) {
+    CNitfProperty* field = FindProperty(map, name);
+    return field && field->getDataType() == CNitfProperty::eString &&
+           _stricmp(field->getAsString(), padded(value, width).c_str()) == 0;
+}
+
+static const CFieldLayout& securityLayout(eNitfVersion_t version) {
+    static const CFieldLayout none;
+    // The 2.0 control-and-handling field is kept as "DECTLH"; callers look it up by that name.
+    static const CFieldLayout nitf20 = CFieldLayout::security20("DES", "DECTLH");
+    static const CFieldLayout nitf21 = CFieldLayout::security21("DES");
+    static const CFieldLayout osde{{"DESSEC", 167}};
+    switch (version) {
+    case eNitfVersion20:
+        return nitf20;
+    case eNitfVersion21:
+    case eNitfVersion21Variant:
+    case eNsifVersion10:
+        return nitf21;
+    case eOsdeVersion01:
+        return osde;
+    default:
+        return none;
+    }
+}
+
+static const CFieldLayout& cloudShapeLayout() {
+    static const CFieldLayout layout{
+        {"SHAPE_USE", 25},
+        {"SHAPE_CLASS", 10},
+        {"CC_SOURCE", 18, FieldForm::Text, whenEquals("SHAPE_USE", "CLOUD_SHAPES             ")},
+        {"SHAPE1_NAME", 3},
+        {"SHAPE1_START", 6},
+        {"SHAPE2_NAME", 3},
+        {"SHAPE2_START", 6},
+        {"SHAPE3_NAME", 3},
+        {"SHAPE3_START", 6},
+    };
+    return layout;
+}
+
+void CNitfDataExtensionSource::constructor() {
+    m_streamingHeaderLength = 0;
+    m_streamingHeader = nullptr;
+    m_overflow = m_streaming = m_cloudShape = false;
+}
+
+CNitfDataExtensionSource::~CNitfDataExtensionSource() {
+    free(m_streamingHeader);
+    CNitfTag::destroyList(m_overflowTags);
+}
+
+void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FILE* fp, CNitfImageSource* image,
+                                    CNitfSymbolSource* graphic) {
+    clearContents();
+    CNitfTag::destroyList(m_overflowTags);
+    free(m_streamingHeader);
+    constructor();
+    fp = positionAtSubheader(file, fp);
+
+    CFieldLayout{{"DE", 2}}.read(fp, m_properties, &m_fieldNames);
+    if (version == eNitfVersion20) {
+        CFieldLayout{{"DESTAG", 25}}.read(fp, m_properties, &m_fieldNames);
+        m_overflow = fieldEquals(m_properties, "DESTAG", "Registered Extensions", 25) ||
+                     fieldEquals(m_properties, "DESTAG", "Controlled Extensions", 25);
+    } else {
+        CFieldLayout{{"DESID", 25}}.read(fp, m_properties, &m_fieldNames);
+        m_streaming = fieldEquals(m_properties, "DESID", "STREAMING_FILE_HEADER", 25);
+        m_overflow = fieldEquals(m_properties, "DESID", "TRE_OVERFLOW", 25);
+        m_cloudShape = fieldEquals(m_properties, "DESID", "CSSHPA DES", 25);
+    }
+    CFieldLayout{{"DESVER", 2}}.read(fp, m_properties, &m_fieldNames);
+    securityLayout(version).read(fp, m_properties, &m_fieldNames);
+    if (m_overflow) {
+        // DESITEM names the overflowed segment; the TREs are attached by area, not by item.
+        CFieldLayout{{"DESOFLW", 6}, {"DESITEM", 3}}.read(fp, m_properties, &m_fieldNames);
+    }
+    CFieldLayout{{"DESSHL", 4}}.read(fp, m_properties, &m_fieldNames);
+    if (m_cloudShape)
+        cloudShapeLayout().read(fp, m_properties, &m_fieldNames);
+    else
+        CFieldLayout{{"DESSHF", 0, FieldForm::Text, whenNotZero("DESSHL"), "DESSHL"}}.read(fp, m_properties,
+                                                                                         &m_fieldNames);
+
+    if (m_streaming) {
+        readStreamingHeader(fp);
+        return;
+    }
+    if (m_overflow)
+        readOverflowTags(file, fp, image, graphic);
+}
+
+void CNitfDataExtensionSource::readStreamingHeader(FILE* fp) {
+    CFieldLayout{{"SFH_L1", 7}, {"SFH_DELIM1", 4, FieldForm::Binary4}}.read(fp, m_properties, &m_fieldNames);
+    int length = FindProperty(m_properties, "SFH_L1")->getAsInt();
+    if (length < 0)
+        length = 0;
+    CDataStream::requireReadable(fp, length, "A streaming file header");
+    m_streamingHeaderLength = length;
+    m_streamingHeader = static_cast<char*>(HMalloc(length > 0 ? length : 1));
+    size_t got = DKFRead(m_streamingHeader, 1, length, fp);
+    std::memset(m_streamingHeader + got, 0, length - got);
+    CFieldLayout{{"SFH_DELIM2", 4, FieldForm::Binary4}, {"SFH_L2", 7}}.read(fp, m_properties, &m_fieldNames);
+    // Leave the stream at the first byte of the replacement header.
+    DKFSeek64(fp, -(11 + static_cast<__int64>(length)), SEEK_CUR);
+}
+
+void CNitfDataExtensionSource::readOverflowTags(CNitfFile* file, FILE* fp, CNitfImageSource* image,
+                                                CNitfSymbolSource* graphic) {
+    CNitfFileHeader* header = file ? file->getFileHeader() : nullptr;
+    std::list<CNitfTag*>* target = header ? &header->getTaggedRecords() : nullptr;
+    CNitfTag::eTagSource_t source = CNitfTag::eTagSourceUnknown;
+
+    auto area = [&](const char* name) { return fieldEquals(m_properties, "DESOFLW", name, 6); };
+    if (area("XHD") || area("UDHD")) {
+        source = CNitfTag::eTagSourceFileHeaderDES;
+    } else if (area("IXSHD") || area("UDID")) {
+        source = CNitfTag::eTagSourceImageDES;
+        if (image)
+            target = &image->getImageSubheader()->getTaggedRecords();
+    } else if (area("SXSHD")) {
+        source = CNitfTag::eTagSourceSymbolDES;
+        if (graphic)
+            target = &graphic->getTaggedRecords();
+    } else if (area("TXSHD")) {
+        // Text segments are not passed in: their overflow joins the file header's list.
+        source = CNitfTag::eTagSourceTextDES;
+    } else if (area("LXSHD")) {
+        return; // label overflow is not read
+    }
+
+    std::list<CNitfTag*> read;
+    CNitfTag::readArea(fp, m_dataLength, source, read, false);
+    for (CNitfTag* tag : read) {
+        m_overflowTags.push_back(new CNitfTag(*tag));
+        if (target)
+            target->push_back(tag);
+        else
+            delete tag;
+    }
+}
+
+bool CNitfDataExtensionSource::isCSSHPAImageShapeDES() {
+    // Whole-text comparisons against the unpadded words: fields read from a file keep their blanks, so only
+    // values set by a program qualify.
+    CNitfProperty*& id = m_properties[const_cast<char*>("DESID")];
+    if (!id)
+        id = new CNitfProperty("");
+    CNitfProperty*& use = m_properties[const_cast<char*>("SHAPE_USE")];
+    if (!use)
+        use = new CNitfProperty("");
+    return _stricmp(id->toText().c_str(), "CSSHPA DES") == 0 && _stricmp(use->toText().c_str(), "IMAGE_SHAPE") == 0;
+}
+
+bool CNitfDataExtensionSource::isXMLDES() {
+    CNitfProperty* id = FindProperty(m_properties, "DESID");
+    return id && _strnicmp(id->toText().c_str(), "XML_DATA_CONTENT", 16) == 0;
+}

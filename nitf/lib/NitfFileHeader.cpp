@@ -1,0 +1,97 @@
+#include "NitfFileHeader.h"
+
+#include <cstring>
+
+#include "DataStreamRead.h"
+#include "DataStreamWrite.h"
+#include "HostFile.h"
+
+CNitfFileHeader::CNitfFileHeader(eNitfVersion_t version) : m_version(version), m_propertiesModified(false) {}
+
+CNitfFileHeader::~CNitfFileHeader() { clearContents(); }
+
+void CNitfFileHeader::clearContents() {
+    for (auto* list : {&m_symbols, &m_images, &m_labels, &m_texts, &m_dataExtensions, &m_reservedExtensions}) {
+        for (CNitfHeaderDataPair* pair : *list)
+            delete pair;
+        list->clear();
+    }
+    DestroyPropertyMap(m_properties);
+    CNitfTag::destroyList(m_taggedRecords);
+    m_fieldNames.clear();
+}
+
+eNitfVersion_t CNitfFileHeader::readVersion(FILE* fp) {
+    char text[10] = {0};
+    DKFRead(text, 1, 9, fp);
+    static const struct {
+        const char* text;
+        eNitfVersion_t version;
+    } known[] = {{"NITF01.10", eNitfVersion11}, {"NITF02.00", eNitfVersion20}, {"NITF02.10", eNitfVersion21},
+                 {"NSIF01.00", eNsifVersion10}, {"NSIF01.01", eNsifVersion10}, {"OSDE01.00", eOsdeVersion01}};
+    for (const auto& entry : known) {
+        if (std::strcmp(text, entry.text) == 0)
+            return entry.version;
+    }
+    return eNitfVersionUnknown;
+}
+
+__int64 CNitfFileHeader::readPairs(FILE* fp, __int64 firstOffset, int countWidth, int headerLengthWidth,
+                                   int dataLengthWidth, std::vector<CNitfHeaderDataPair*>* list,
+                                   __int64& fieldBytes, int& count) {
+    CDataStreamRead in(fp);
+    count = in.readDecimal(countWidth);
+    fieldBytes = countWidth;
+    if (count <= 0)
+        return 0;
+    __int64 position = firstOffset;
+    __int64 total = 0;
+    for (int i = 0; i < count; ++i) {
+        int headerLength = in.readDecimal(headerLengthWidth);
+        __int64 dataLength = in.readDecimal64(dataLengthWidth);
+        list->push_back(new CNitfHeaderDataPair(position, headerLength, dataLength));
+        fieldBytes += headerLengthWidth + dataLengthWidth;
+        position += headerLength + dataLength;
+        total += headerLength + dataLength;
+    }
+    return total;
+}
+
+void CNitfFileHeader::writePairs(FILE* fp, int countWidth, int headerLengthWidth, int dataLengthWidth,
+                                 std::vector<CNitfHeaderDataPair*>* list) {
+    CDataStreamWrite out(fp);
+    out.writeDecimal(static_cast<int>(list->size()), countWidth, true);
+    for (const CNitfHeaderDataPair* pair : *list) {
+        out.writeDecimal64(pair->getHeaderLength(), headerLengthWidth, true);
+        // Every data length is clamped to ten nines; only the image table's field is that wide.
+        __int64 dataLength = pair->getDataLength();
+        out.writeDecimal64(dataLength > 9999999999LL ? 9999999999LL : dataLength, dataLengthWidth, true);
+    }
+}
+
+__int64 CNitfFileHeader::computeFileLength() {
+    return computeStorageLength() + CNitfHeaderDataPair::computeVectorLengths(&m_images);
+}
+
+__int64 CNitfFileHeader::readSegmentTable(FILE* fp, const char* countName, __int64 firstOffset,
+                                          int headerLengthWidth, int dataLengthWidth,
+                                          std::vector<CNitfHeaderDataPair*>* list) {
+    SetProperty(m_properties, countName, CNitfProperty::getNewFromString(fp, 3));
+    recordField(countName);
+    DKFSeek64(fp, -3, SEEK_CUR);
+    __int64 fieldBytes = 0;
+    int count = 0;
+    return readPairs(fp, firstOffset, 3, headerLengthWidth, dataLengthWidth, list, fieldBytes, count);
+}
+
+void CNitfFileHeader::readTagArea(FILE* fp, const char* lengthName) {
+    CNitfProperty* lengthField = CNitfProperty::getNewFromString(fp, 5);
+    SetProperty(m_properties, lengthName, lengthField);
+    recordField(lengthName);
+    int length = lengthField->getAsInt();
+    if (length <= 0)
+        return;
+    // The overflow number is not kept: the overflow is resolved when its data extension segment is read.
+    DKFSeek64(fp, 3, SEEK_CUR);
+    CNitfTag::readArea(fp, length - 3, CNitfTag::eTagSourceFileHeader, m_taggedRecords, true);
+}

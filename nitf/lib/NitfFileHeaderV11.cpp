@@ -1,0 +1,1 @@
+#include "NitfFileHeaderV11.h"

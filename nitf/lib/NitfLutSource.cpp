@@ -1,0 +1,94 @@
+#include "NitfLutSource.h"
+
+#include <cstring>
+#include <vector>
+
+#include "HostFile.h"
+#include "NitfFile.h"
+
+CNitfLutSource::CNitfLutSource()
+    : m_entryType(eEntryTypeNone), m_entryCount(0), m_entryOffset(0), m_interleaved(false), m_band(0) {}
+
+int CNitfLutSource::getEntrySize() const {
+    switch (m_entryType) {
+    case eEntryTypeRGB:
+        return 3;
+    case eEntryTypeRGBA:
+    case eEntryTypeCMYK:
+        return 4;
+    case eEntryTypeMono:
+    case eEntryTypeMono5:
+    case eEntryTypeMono6:
+    case eEntryTypeMono7:
+        return 1;
+    default:
+        return 0;
+    }
+}
+
+int CNitfLutSource::getSize() const { return m_entryCount > 0 ? getEntrySize() * m_entryCount : 0; }
+
+void CNitfLutSource::deinterleave(char* dst, char* src, int entries, int components, int stride) {
+    for (int e = 0; e < entries; ++e) {
+        for (int c = 0; c < components; ++c)
+            dst[e + c * stride] = *src++;
+    }
+}
+
+void CNitfLutSource::interleave(char* dst, char* src, int entries, int components, int stride) {
+    for (int e = 0; e < entries; ++e) {
+        for (int c = 0; c < components; ++c)
+            *dst++ = src[e + c * stride];
+    }
+}
+
+// Reads the stored table; bytes past the end of the file read as zeros.
+static void readStored(CNitfFile* file, __int64 offset, char* buffer, int size) {
+    FILE* fp = file->getInputStream();
+    DKFSeek64(fp, offset, SEEK_SET);
+    size_t got = size > 0 ? DKFRead(buffer, 1, size, fp) : 0;
+    if (static_cast<int>(got) < size)
+        std::memset(buffer + got, 0, size - got);
+}
+
+void CNitfLutSource::readInterleaved(CNitfFile* file, char* buffer, int) {
+    int size = getSize();
+    if (size <= 0)
+        return;
+    if (m_interleaved) {
+        readStored(file, m_entryOffset, buffer, size);
+        return;
+    }
+    std::vector<char> stored(size);
+    readStored(file, m_entryOffset, stored.data(), size);
+    interleave(buffer, stored.data(), m_entryCount, getEntrySize(), m_entryCount);
+}
+
+void CNitfLutSource::readNonInterleaved(CNitfFile* file, char* buffer, int) {
+    int size = getSize();
+    if (size <= 0)
+        return;
+    if (!m_interleaved) {
+        readStored(file, m_entryOffset, buffer, size);
+        return;
+    }
+    // The caller wants its buffer in entry order: convert from the stored component tables.
+    std::vector<char> stored(size);
+    readStored(file, m_entryOffset, stored.data(), size);
+    interleave(buffer, stored.data(), m_entryCount, getEntrySize(), m_entryCount);
+}
+
+void CNitfLutSource::writeNonInterleaved(CNitfFile* file, char* buffer, int) {
+    int size = getSize();
+    if (size <= 0)
+        return;
+    FILE* fp = file->getOutputStream();
+    DKFSeek64(fp, m_entryOffset, SEEK_SET);
+    if (!m_interleaved) {
+        DKFWrite(buffer, size, 1, fp);
+        return;
+    }
+    std::vector<char> stored(size);
+    deinterleave(stored.data(), buffer, m_entryCount, getEntrySize(), m_entryCount);
+    DKFWrite(stored.data(), size, 1, fp);
+}
