@@ -2,3 +2,4 @@
 #pragma once
 
 int runSelfCheck(int argc, char** argv);
+int runInfo(int argc, char** argv);

@@ -1,6 +1,6 @@
-// A data extension segment's sub-header, recognising four kinds by identifier: TRE overflow (whose TREs join the
-// tag list of the header they overflowed from), the streaming file header (whose replacement header bytes it
-// loads), cloud shapes ("CSSHPA DES") and XML data.
+// A data extension segment's sub-header, recognising four kinds by identifier: TRE overflow (whose TREs join
+// the tag list of the header they overflowed from), the streaming file header (whose replacement header bytes
+// it loads), cloud shapes ("CSSHPA DES") and XML data.
 #pragma once
 
 #include "NitfSegmentSource.h"
@@ -15,9 +15,9 @@ public:
 
     void constructor();
 
-    // Reads the sub-header: from `fp` where it stands, or (null `fp`) from the file's stream at the sub-header.
-    // Overflow TREs go to `image`'s or `graphic`'s list when the overflowed area is theirs and they are given,
-    // else to the file header's list.
+    // Reads the sub-header: from `fp` where it stands, or (null `fp`) from the file's stream at the
+    // sub-header. Overflow TREs go to `image`'s or `graphic`'s list when the overflowed area is theirs and
+    // they are given, else to the file header's list.
     void read(CNitfFile* file, eNitfVersion_t version, FILE* fp, CNitfImageSource* image,
               CNitfSymbolSource* graphic);
 

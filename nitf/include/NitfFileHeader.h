@@ -1,4 +1,5 @@
-// What every version's file header has in common: version, field values, segment layout lists, file-level TREs.
+// What every version's file header has in common: version, field values, segment layout lists, file-level
+// TREs.
 #pragma once
 
 #include <cstdio>
@@ -27,7 +28,8 @@ public:
     virtual __int64 computeStorageLength() = 0;
     // Copies the file title into `title` (at least 81 bytes).
     virtual void getTitle(char* title) = 0;
-    // A new image sub-header of this header's version for image `index`, read from the file; the caller owns it.
+    // A new image sub-header of this header's version for image `index`, read from the file; the caller owns
+    // it.
     virtual CNitfImageSubheader* getNewImageSubheader(FILE* fp, int index) = 0;
 
     // Reads nine bytes and maps them to a version; the stream is left after them.
@@ -62,11 +64,11 @@ public:
     void addImageHeaderDataPair(CNitfHeaderDataPair* pair) { m_images.push_back(pair); }
     void addTaggedRecord(CNitfTag* tag) { m_taggedRecords.push_back(tag); }
 
-    // Reads one segment table at the stream's position (its count field); returns the sum of its sub-header and
-    // data lengths. `fieldBytes` and `count` report the table's own size and entry count.
+    // Reads one segment table at the stream's position (its count field); returns the sum of its sub-header
+    // and data lengths. `fieldBytes` and `count` report the table's own size and entry count.
     static __int64 readPairs(FILE* fp, __int64 firstOffset, int countWidth, int headerLengthWidth,
-                             int dataLengthWidth, std::vector<CNitfHeaderDataPair*>* list, __int64& fieldBytes,
-                             int& count);
+                             int dataLengthWidth, std::vector<CNitfHeaderDataPair*>* list,
+                             __int64& fieldBytes, int& count);
     static void writePairs(FILE* fp, int countWidth, int headerLengthWidth, int dataLengthWidth,
                            std::vector<CNitfHeaderDataPair*>* list);
 
@@ -74,10 +76,11 @@ public:
     __int64 computeFileLength();
 
 protected:
-    // Reads a TRE area (UDHD or XHD): its 5-digit length (stored under `lengthName`), the 3-digit overflow field
-    // (skipped), then the TREs.
+    // Reads a TRE area (UDHD or XHD): its 5-digit length (stored under `lengthName`), the 3-digit overflow
+    // field (skipped), then the TREs.
     void readTagArea(FILE* fp, const char* lengthName);
-    // Reads one counted field (NUMI, ...) as text and the segment table behind it; returns the segments' total.
+    // Reads one counted field (NUMI, ...) as text and the segment table behind it; returns the segments'
+    // total.
     __int64 readSegmentTable(FILE* fp, const char* countName, __int64 firstOffset, int headerLengthWidth,
                              int dataLengthWidth, std::vector<CNitfHeaderDataPair*>* list);
     void recordField(const char* name) { m_fieldNames.push_back(name); }

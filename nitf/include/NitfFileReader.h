@@ -21,9 +21,9 @@ public:
     CNitfFileReader(const CNitfFileReader&) = delete;
     CNitfFileReader& operator=(const CNitfFileReader&) = delete;
 
-    // Opens the file read-only (binary) and, the first time, reads its header. Returns null, changing nothing,
-    // when the file cannot be opened; raises vexo::Exception for a file of unknown version. A reader keeps the
-    // header of the first file it opened.
+    // Opens the file read-only (binary) and, the first time, reads its header. Returns null, changing
+    // nothing, when the file cannot be opened; raises vexo::Exception for a file of unknown version. A reader
+    // keeps the header of the first file it opened.
     FILE* open(const char* fileName, const char* access = "rb");
     void close() override;
     bool isOpen() const { return m_open; }

@@ -1,4 +1,5 @@
-// The georeferencing of an image segment: the coordinate type given by ICORDS and where IGEOLO lies in the file.
+// The georeferencing of an image segment: the coordinate type given by ICORDS and where IGEOLO lies in the
+// file.
 #pragma once
 
 #include "HostCompat.h"
@@ -20,8 +21,8 @@ public:
 
     CNitfGeorefInfo() : m_type(eCoordinatesNone), m_igeoloOffset(0) {}
 
-    // Derives the coordinate type from ICORDS: a blank means none in the 2.1 family, "N" means none in NITF 2.0
-    // and 1.x (where it is UTM north in 2.1).
+    // Derives the coordinate type from ICORDS: a blank means none in the 2.1 family, "N" means none in
+    // NITF 2.0 and 1.x (where it is UTM north in 2.1).
     void setCoordinateType(char icords, eNitfVersion_t version);
     eCoordinateType_t getCoordinateType() const { return m_type; }
     bool hasCoordinates() const { return m_type != eCoordinatesNone; }

@@ -9,17 +9,17 @@ public:
     // How image data is compressed; set by whoever builds the source.
     enum eCompressionType_t {
         eCompressionNone = 0,
-        eCompressionUncompressed = 1, // NC, NM
-        eCompressionUserDefined = 2,  // C0, M0
-        eCompressionBilevel = 3,      // C1, M1
-        eCompressionAridPcm = 4,      // C2, M2
-        eCompressionJpeg = 5,         // C3, M3 (12-bit samples are delivered in two bytes)
-        eCompressionVQ = 6,           // C4, M4
-        eCompressionJpegLossless = 7, // C5, M5
+        eCompressionUncompressed = 1,    // NC, NM
+        eCompressionUserDefined = 2,     // C0, M0
+        eCompressionBilevel = 3,         // C1, M1
+        eCompressionAridPcm = 4,         // C2, M2
+        eCompressionJpeg = 5,            // C3, M3 (12-bit samples are delivered in two bytes)
+        eCompressionVQ = 6,              // C4, M4
+        eCompressionJpegLossless = 7,    // C5, M5
         eCompressionDownsampledJpeg = 8, // I1
-        eCompressionJpeg2000 = 9,     // C8, M8
-        eCompressionCorrelated = 10,  // C6, M6
-        eCompressionComplexSar = 11,  // C7, M7
+        eCompressionJpeg2000 = 9,        // C8, M8
+        eCompressionCorrelated = 10,     // C6, M6
+        eCompressionComplexSar = 11,     // C7, M7
     };
     // IMODE: "S", "B", "P", "R", anything else.
     enum eInterleavingType_t {

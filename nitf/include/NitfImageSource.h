@@ -1,6 +1,6 @@
-// The base of every image data source: one object per image segment that hands out (or takes) the image's pixels
-// block by block. It owns the blocking geometry, the block mask and pad pixel of masked images, the table of
-// block offsets, the interleaving conversions and the bridge to the host projection record.
+// The base of every image data source: one object per image segment that hands out (or takes) the image's
+// pixels block by block. It owns the blocking geometry, the block mask and pad pixel of masked images, the
+// table of block offsets, the interleaving conversions and the bridge to the host projection record.
 #pragma once
 
 #include <cstdio>
@@ -20,8 +20,8 @@ public:
 
 protected:
     // Fills the tile offset table from the data offset and the block mask (null when unmasked).
-    virtual void prepareTileOffsets(FILE* fp, long long dataOffset, long long dataLength, unsigned int* blockMask,
-                                    int count) = 0;
+    virtual void prepareTileOffsets(FILE* fp, long long dataOffset, long long dataLength,
+                                    unsigned int* blockMask, int count) = 0;
 
 public:
     virtual ~CNitfImageSource();
@@ -32,8 +32,10 @@ public:
     // One whole block, pixel-interleaved, `rowBytes` apart.
     virtual bool readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y) = 0;
     // One band of one block, `rowBytes` apart.
-    virtual bool readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y, int band) = 0;
-    virtual bool readBitmap(char* buffer, int x0, int y0, int width, int srcRows, int outWidthBits, int outRows);
+    virtual bool readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y,
+                                        int band) = 0;
+    virtual bool readBitmap(char* buffer, int x0, int y0, int width, int srcRows, int outWidthBits,
+                            int outRows);
     virtual void readFinish();
     virtual void writeStart(FILE* fp, long long dataOffset, long long dataLength);
     virtual bool isWriteable();

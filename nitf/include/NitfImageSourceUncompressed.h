@@ -16,7 +16,8 @@ public:
     void readStart(FILE* fp, long long dataOffset, long long dataLength) override;
     bool readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y) override;
     bool readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y, int band) override;
-    bool readBitmap(char* buffer, int x0, int y0, int width, int srcRows, int outWidthBits, int outRows) override;
+    bool readBitmap(char* buffer, int x0, int y0, int width, int srcRows, int outWidthBits,
+                    int outRows) override;
     void writeStart(FILE* fp, long long dataOffset, long long dataLength) override;
     bool isWriteable() override;
     bool writeTileNonInterleaved(CNitfFile* file, char* buffer, int x, int y, int band) override;

@@ -85,11 +85,13 @@ protected:
     void readBand(FILE* fp, int band, int count, int representation);
     void readTagArea(FILE* fp, const char* lengthName);
 
-    // Writes the fields from ENCRYP to the end in the 2.1 layout (shared by the 2.0 writer, whose fields there
-    // are the same), and the length that produces on top of `fixedLength` (the fields up to IC, without IGEOLO).
+    // Writes the fields from ENCRYP to the end in the 2.1 layout (shared by the 2.0 writer, whose fields
+    // there are the same), and the length that produces on top of `fixedLength` (the fields up to IC, without
+    // IGEOLO).
     void writeBody(FILE* fp);
     __int64 computeBodyStorageLength(__int64 fixedLength);
-    // The title: the classification word unless unclassified, then the text of `nameField`; cut to 80 characters.
+    // The title: the classification word unless unclassified, then the text of `nameField`; cut to 80
+    // characters.
     void buildTitle(const char* nameField, char* title);
     // Writes the named fields from the map in their widths; a field with no value writes nothing.
     void writeFields(FILE* fp, std::initializer_list<std::pair<const char*, int>> fields);

@@ -1,5 +1,5 @@
-// The image sub-header of NITF 1.x: the 2.0 layout with the downgrading event always present and no user-defined
-// or extended data areas.
+// The image sub-header of NITF 1.x: the 2.0 layout with the downgrading event always present and no
+// user-defined or extended data areas.
 #pragma once
 
 #include "NitfImageSubheaderV20.h"

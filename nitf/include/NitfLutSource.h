@@ -10,11 +10,11 @@ public:
     // Codes of the table layouts; the entry size follows from the code.
     enum eEntryType_t {
         eEntryTypeNone = 0,
-        eEntryTypeRGB = 1,    // three component tables (red, green, blue), 3 bytes per entry
-        eEntryTypeRGBA = 2,   // four component tables, 4 bytes per entry
-        eEntryTypeCMYK = 3,   // four component tables, 4 bytes per entry
-        eEntryTypeMono = 4,   // one table, 1 byte per entry
-        eEntryTypeMono5 = 5,  // single-table variants, 1 byte per entry
+        eEntryTypeRGB = 1,   // three component tables (red, green, blue), 3 bytes per entry
+        eEntryTypeRGBA = 2,  // four component tables, 4 bytes per entry
+        eEntryTypeCMYK = 3,  // four component tables, 4 bytes per entry
+        eEntryTypeMono = 4,  // one table, 1 byte per entry
+        eEntryTypeMono5 = 5, // single-table variants, 1 byte per entry
         eEntryTypeMono6 = 6,
         eEntryTypeMono7 = 7,
     };
@@ -41,8 +41,8 @@ public:
     static void deinterleave(char* dst, char* src, int entries, int components, int stride);
     static void interleave(char* dst, char* src, int entries, int components, int stride);
 
-    // The table as entries (each entry's components together); with the interleaved flag set, the stored bytes
-    // unchanged. `buffer` holds getSize() bytes.
+    // The table as entries (each entry's components together); with the interleaved flag set, the stored
+    // bytes unchanged. `buffer` holds getSize() bytes.
     void readInterleaved(CNitfFile* file, char* buffer, int size);
     // The table in the file's component-table layout (converted from the caller's entry layout when the
     // interleaved flag is set), read from and written to the entry offset.

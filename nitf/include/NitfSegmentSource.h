@@ -1,5 +1,5 @@
-// What the graphic/symbol, label, text and data extension segments share: where the segment lies, its sub-header
-// fields, the TREs of its extended area, and access to its data bytes.
+// What the graphic/symbol, label, text and data extension segments share: where the segment lies, its
+// sub-header fields, the TREs of its extended area, and access to its data bytes.
 #pragma once
 
 #include <cstdio>

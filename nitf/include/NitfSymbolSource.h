@@ -5,7 +5,7 @@
 
 class CNitfSymbolSource : public CNitfSegmentSource {
 public:
-    // Reads the sub-header in the layout of `version`; from `fp` where it stands, or when `fp` is null from the
-    // file's stream positioned at the sub-header.
+    // Reads the sub-header in the layout of `version`; from `fp` where it stands, or when `fp` is null from
+    // the file's stream positioned at the sub-header.
     void read(CNitfFile* file, eNitfVersion_t version, FILE* fp = nullptr);
 };

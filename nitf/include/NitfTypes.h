@@ -1,8 +1,8 @@
 // Types shared across the library's interface.
 #pragma once
 
-// The file's format version; the numbers are fixed (the creator, the sub-header factories and the georeferencing
-// compare against them).
+// The file's format version; the numbers are fixed (the creator, the sub-header factories and the
+// georeferencing compare against them).
 enum eNitfVersion_t {
     eNitfVersion11 = 0,        // "NITF01.10"
     eNitfVersion20 = 1,        // "NITF02.00"

@@ -120,9 +120,9 @@ CFieldLayout CFieldLayout::security21(const char* prefix) {
     static const struct {
         const char* suffix;
         int width;
-    } group[] = {{"CLAS", 1}, {"CLSY", 2}, {"CODE", 11}, {"CTLH", 2},  {"REL", 20}, {"DCTP", 2},
-                 {"DCDT", 8}, {"DCXM", 4}, {"DG", 1},    {"DGDT", 8},  {"CLTX", 43}, {"CATP", 1},
-                 {"CAUT", 40}, {"CRSN", 1}, {"SRDT", 8}, {"CTLN", 15}};
+    } group[] = {{"CLAS", 1},  {"CLSY", 2}, {"CODE", 11}, {"CTLH", 2}, {"REL", 20},  {"DCTP", 2},
+                 {"DCDT", 8},  {"DCXM", 4}, {"DG", 1},    {"DGDT", 8}, {"CLTX", 43}, {"CATP", 1},
+                 {"CAUT", 40}, {"CRSN", 1}, {"SRDT", 8},  {"CTLN", 15}};
     CFieldLayout layout;
     for (const auto& field : group)
         layout.add({intern(std::string(prefix) + field.suffix), field.width});

@@ -1,5 +1,5 @@
-// The fixed-width field layouts of headers and sub-headers, as data. One layout per header kind and version is
-// walked by one reader, one writer and one length counter, so the three agree by construction.
+// The fixed-width field layouts of headers and sub-headers, as data. One layout per header kind and version
+// is walked by one reader, one writer and one length counter, so the three agree by construction.
 #pragma once
 
 #include <cstdio>
@@ -31,7 +31,7 @@ struct FieldCondition {
 
 struct FieldSpec {
     const char* name;
-    int width;                        // bytes, when widthField is null
+    int width; // bytes, when widthField is null
     FieldForm form = FieldForm::Text;
     FieldCondition when = {};
     const char* widthField = nullptr; // the width is the integer value of this earlier field
@@ -45,8 +45,8 @@ public:
     CFieldLayout& add(const FieldSpec& field);
     CFieldLayout& add(const CFieldLayout& other);
 
-    // Reads every present field at the stream's position into `map` (replacing earlier values of the same names)
-    // and appends the names read to `order`, when given.
+    // Reads every present field at the stream's position into `map` (replacing earlier values of the same
+    // names) and appends the names read to `order`, when given.
     void read(FILE* fp, PropertyMap& map, std::vector<const char*>* order = nullptr) const;
     // Writes every present field from `map`; a field missing from the map is written as blanks.
     void write(FILE* fp, PropertyMap& map) const;
@@ -78,4 +78,6 @@ inline FieldCondition whenEquals(const char* field, const char* value) {
 inline FieldCondition whenNotEquals(const char* field, const char* value) {
     return {FieldCondition::NotEquals, field, value};
 }
-inline FieldCondition whenNotZero(const char* field) { return {FieldCondition::NotZero, field, nullptr}; }
+inline FieldCondition whenNotZero(const char* field) {
+    return {FieldCondition::NotZero, field, nullptr};
+}

@@ -71,8 +71,8 @@ CNitfDataExtensionSource::~CNitfDataExtensionSource() {
     CNitfTag::destroyList(m_overflowTags);
 }
 
-void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FILE* fp, CNitfImageSource* image,
-                                    CNitfSymbolSource* graphic) {
+void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FILE* fp,
+                                    CNitfImageSource* image, CNitfSymbolSource* graphic) {
     clearContents();
     CNitfTag::destroyList(m_overflowTags);
     free(m_streamingHeader);
@@ -101,7 +101,7 @@ void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FIL
         cloudShapeLayout().read(fp, m_properties, &m_fieldNames);
     else
         CFieldLayout{{"DESSHF", 0, FieldForm::Text, whenNotZero("DESSHL"), "DESSHL"}}.read(fp, m_properties,
-                                                                                         &m_fieldNames);
+                                                                                           &m_fieldNames);
 
     if (m_streaming) {
         readStreamingHeader(fp);
@@ -170,7 +170,8 @@ bool CNitfDataExtensionSource::isCSSHPAImageShapeDES() {
     CNitfProperty*& use = m_properties[const_cast<char*>("SHAPE_USE")];
     if (!use)
         use = new CNitfProperty("");
-    return _stricmp(id->toText().c_str(), "CSSHPA DES") == 0 && _stricmp(use->toText().c_str(), "IMAGE_SHAPE") == 0;
+    return _stricmp(id->toText().c_str(), "CSSHPA DES") == 0 &&
+           _stricmp(use->toText().c_str(), "IMAGE_SHAPE") == 0;
 }
 
 bool CNitfDataExtensionSource::isXMLDES() {

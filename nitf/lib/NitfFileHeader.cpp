@@ -8,10 +8,13 @@
 
 CNitfFileHeader::CNitfFileHeader(eNitfVersion_t version) : m_version(version), m_propertiesModified(false) {}
 
-CNitfFileHeader::~CNitfFileHeader() { clearContents(); }
+CNitfFileHeader::~CNitfFileHeader() {
+    clearContents();
+}
 
 void CNitfFileHeader::clearContents() {
-    for (auto* list : {&m_symbols, &m_images, &m_labels, &m_texts, &m_dataExtensions, &m_reservedExtensions}) {
+    for (auto* list :
+         {&m_symbols, &m_images, &m_labels, &m_texts, &m_dataExtensions, &m_reservedExtensions}) {
         for (CNitfHeaderDataPair* pair : *list)
             delete pair;
         list->clear();

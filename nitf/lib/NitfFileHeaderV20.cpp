@@ -34,7 +34,9 @@ void CNitfFileHeaderV20::read(FILE* fp, CNitfFileReader*) {
 }
 
 // NUMS, NUML, NUMT, NUMDES, NUMRES, UDHDL and XHDL of a written header: images only, no TREs.
-static const char kWrittenTail[] = "000000000000000" "00000" "00000";
+static const char kWrittenTail[] = "000000000000000"
+                                   "00000"
+                                   "00000";
 
 void CNitfFileHeaderV20::write(FILE* fp) {
     CFieldLayout head;

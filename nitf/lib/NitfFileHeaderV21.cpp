@@ -16,13 +16,14 @@ static const char kReadSignature[] =
 
 // From FHDR to ENCRYP: the same for every member of the family.
 static const CFieldLayout& identityLayout() {
-    static const CFieldLayout layout = CFieldLayout{
-        {"FHDR", 9}, {"CLEVEL", 2}, {"STYPE", 4}, {"OSTAID", 10}, {"FDT", 14}, {"FTITLE", 80},
-    }
-                                           .add(CFieldLayout::security21("FS"))
-                                           .add({"FSCOP", 5})
-                                           .add({"FSCPYS", 5})
-                                           .add({"ENCRYP", 1});
+    static const CFieldLayout layout =
+        CFieldLayout{
+            {"FHDR", 9}, {"CLEVEL", 2}, {"STYPE", 4}, {"OSTAID", 10}, {"FDT", 14}, {"FTITLE", 80},
+        }
+            .add(CFieldLayout::security21("FS"))
+            .add({"FSCOP", 5})
+            .add({"FSCPYS", 5})
+            .add({"ENCRYP", 1});
     return layout;
 }
 
@@ -38,8 +39,11 @@ static const CFieldLayout& lengthLayout() {
     return layout;
 }
 
-// The fixed tail that follows the image table in a written header: NUMS, NUMX, NUMT, NUMDES, NUMRES, UDHDL, XHDL.
-static const char kWrittenTail[] = "000000000000000" "00000" "00000";
+// The fixed tail that follows the image table in a written header: NUMS, NUMX, NUMT, NUMDES, NUMRES, UDHDL,
+// XHDL.
+static const char kWrittenTail[] = "000000000000000"
+                                   "00000"
+                                   "00000";
 
 CNitfFileHeaderV21::CNitfFileHeaderV21(eNitfVersion_t version) : CNitfFileHeader(version) {}
 
@@ -56,8 +60,8 @@ void CNitfFileHeaderV21::readFields(FILE* fp) {
     SetProperty(m_properties, "NUMX", reserved);
     recordField("NUMX");
     if (reserved->getAsInt() != 0) {
-        // Nothing after a non-zero reserved count is trusted. Two conformance files are known to carry one; the
-        // outcome is the same for them as for any other file.
+        // Nothing after a non-zero reserved count is trusted. Two conformance files are known to carry one;
+        // the outcome is the same for them as for any other file.
         const char* name = fp2filename(fp);
         if (std::strstr(name, "i_3125d.ntf") == nullptr)
             (void)std::strstr(name, "i_3125c.ntf");
@@ -123,7 +127,8 @@ __int64 CNitfFileHeaderV21::findStreamingHeader(FILE* fp) {
 
     CNitfProperty* declared = FindProperty(m_properties, "HL");
     if (!declared || ScanInt64(reinterpret_cast<char*>(head), 7) != declared->getAsInt64())
-        NITF_RAISE("Only a file header replacement is supported for a streaming file header.", kReadSignature);
+        NITF_RAISE("Only a file header replacement is supported for a streaming file header.",
+                   kReadSignature);
     return start + 11;
 }
 

@@ -66,21 +66,33 @@ CNitfFileHeader* CNitfFileReader::getNewFileHeader() {
         m_header = new CNitfFileHeaderV21(version);
         break;
     default:
-        NITF_RAISE("Unknown NITF file version", "class CNitfFileHeader *__cdecl CNitfFileReader::getNewFileHeader(void)");
+        NITF_RAISE("Unknown NITF file version",
+                   "class CNitfFileHeader *__cdecl CNitfFileReader::getNewFileHeader(void)");
     }
     m_header->read(m_fp, this);
     return m_header;
 }
 
-int CNitfFileReader::getImageCount() const { return m_header ? m_header->getImageCount() : 0; }
-int CNitfFileReader::getSymbolCount() const { return m_header ? m_header->getSymbolCount() : 0; }
-int CNitfFileReader::getLabelCount() const { return m_header ? m_header->getLabelCount() : 0; }
-int CNitfFileReader::getTextCount() const { return m_header ? m_header->getTextCount() : 0; }
-int CNitfFileReader::getDataExtensionCount() const { return m_header ? m_header->getDataExtensionCount() : 0; }
+int CNitfFileReader::getImageCount() const {
+    return m_header ? m_header->getImageCount() : 0;
+}
+int CNitfFileReader::getSymbolCount() const {
+    return m_header ? m_header->getSymbolCount() : 0;
+}
+int CNitfFileReader::getLabelCount() const {
+    return m_header ? m_header->getLabelCount() : 0;
+}
+int CNitfFileReader::getTextCount() const {
+    return m_header ? m_header->getTextCount() : 0;
+}
+int CNitfFileReader::getDataExtensionCount() const {
+    return m_header ? m_header->getDataExtensionCount() : 0;
+}
 
 namespace {
 
-// Builds a segment object for the pair at `index` and lets it read its sub-header; the caller owns the result.
+// Builds a segment object for the pair at `index` and lets it read its sub-header; the caller owns the
+// result.
 template <typename Source, typename Read>
 Source* newSegment(CNitfHeaderDataPair* pair, int index, Read read) {
     Source* source = new Source;
@@ -100,32 +112,33 @@ Source* newSegment(CNitfHeaderDataPair* pair, int index, Read read) {
 CNitfSymbolSource* CNitfFileReader::getNewSymbolSource(int index) {
     CNitfHeaderDataPair* pair = m_header && m_open ? m_header->getSymbolHeaderDataPair(index) : nullptr;
     if (!pair)
-        NITF_RAISE("Invalid symbol index", "class CNitfSymbolSource *__cdecl CNitfFileReader::getNewSymbolSource(int)");
-    return newSegment<CNitfSymbolSource>(pair, index, [&](CNitfSymbolSource& source) {
-        source.read(this, m_header->getVersion(), nullptr);
-    });
+        NITF_RAISE("Invalid symbol index",
+                   "class CNitfSymbolSource *__cdecl CNitfFileReader::getNewSymbolSource(int)");
+    return newSegment<CNitfSymbolSource>(
+        pair, index, [&](CNitfSymbolSource& source) { source.read(this, m_header->getVersion(), nullptr); });
 }
 
 CNitfLabelSource* CNitfFileReader::getNewLabelSource(int index) {
     CNitfHeaderDataPair* pair = m_header && m_open ? m_header->getLabelHeaderDataPair(index) : nullptr;
     if (!pair)
-        NITF_RAISE("Invalid label index", "class CNitfLabelSource *__cdecl CNitfFileReader::getNewLabelSource(int)");
-    return newSegment<CNitfLabelSource>(pair, index, [&](CNitfLabelSource& source) {
-        source.read(this, m_header->getVersion(), nullptr);
-    });
+        NITF_RAISE("Invalid label index",
+                   "class CNitfLabelSource *__cdecl CNitfFileReader::getNewLabelSource(int)");
+    return newSegment<CNitfLabelSource>(
+        pair, index, [&](CNitfLabelSource& source) { source.read(this, m_header->getVersion(), nullptr); });
 }
 
 CNitfTextSource* CNitfFileReader::getNewTextSource(int index) {
     CNitfHeaderDataPair* pair = m_header && m_open ? m_header->getTextHeaderDataPair(index) : nullptr;
     if (!pair)
-        NITF_RAISE("Invalid text index", "class CNitfTextSource *__cdecl CNitfFileReader::getNewTextSource(int)");
-    return newSegment<CNitfTextSource>(pair, index, [&](CNitfTextSource& source) {
-        source.read(this, m_header->getVersion(), nullptr);
-    });
+        NITF_RAISE("Invalid text index",
+                   "class CNitfTextSource *__cdecl CNitfFileReader::getNewTextSource(int)");
+    return newSegment<CNitfTextSource>(
+        pair, index, [&](CNitfTextSource& source) { source.read(this, m_header->getVersion(), nullptr); });
 }
 
 CNitfDataExtensionSource* CNitfFileReader::getNewDataExtensionSource(int index) {
-    CNitfHeaderDataPair* pair = m_header && m_open ? m_header->getDataExtensionHeaderDataPair(index) : nullptr;
+    CNitfHeaderDataPair* pair =
+        m_header && m_open ? m_header->getDataExtensionHeaderDataPair(index) : nullptr;
     if (!pair)
         NITF_RAISE("Invalid data extension index",
                    "class CNitfDataExtensionSource *__cdecl CNitfFileReader::getNewDataExtensionSource(int)");
@@ -167,7 +180,8 @@ const CompressionCode kCompressionCodes[] = {
     {"M8", CNitfImagePropertiesIF::eCompressionJpeg2000, true},
 };
 
-const char kImageSourceSignature[] = "class CNitfImageSource *__cdecl CNitfFileReader::getNewImageSource(int)";
+const char kImageSourceSignature[] =
+    "class CNitfImageSource *__cdecl CNitfFileReader::getNewImageSource(int)";
 
 } // namespace
 
@@ -209,8 +223,8 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
                               static_cast<int>(code->type), static_cast<int>(code->type));
         default:
             // Decoders that have not landed yet: bi-level, JPEG, VQ and JPEG 2000.
-            NITF_RAISE_FORMAT(kImageSourceSignature, "Compression not yet supported by this build (ISH.IC == %s)",
-                              ic.c_str());
+            NITF_RAISE_FORMAT(kImageSourceSignature,
+                              "Compression not yet supported by this build (ISH.IC == %s)", ic.c_str());
         }
     } catch (...) {
         if (!source)
@@ -242,7 +256,9 @@ CNitfTag* CNitfFileReader::getExtensionTag(const char* name) {
     return m_header ? CNitfTag::find(name, m_header->getTaggedRecords()) : nullptr;
 }
 
-bool CNitfFileReader::hasExtensionRpf() { return getExtensionTag("RPFHDR") != nullptr; }
+bool CNitfFileReader::hasExtensionRpf() {
+    return getExtensionTag("RPFHDR") != nullptr;
+}
 
 CNitfExtension* CNitfFileReader::getNewExtensionPIAPRD() {
     CNitfTag* tag = getExtensionTag("PIAPRD");
@@ -266,7 +282,7 @@ void CNitfFileReader::describeImageSource(int index, char* text) {
         NITF_RAISE("Invalid image index", "void __cdecl CNitfFileReader::describeImageSource(int,char *)");
     CNitfImagePropertiesIF properties;
     properties.setProperties(subheader->getProperties());
-    std::sprintf(text, "%dx%d Pixels, %d Bits per Pixel", properties.getImageWidth(), properties.getImageHeight(),
-                 properties.getBpp());
+    std::sprintf(text, "%dx%d Pixels, %d Bits per Pixel", properties.getImageWidth(),
+                 properties.getImageHeight(), properties.getBpp());
     delete subheader;
 }

@@ -90,13 +90,17 @@ int CNitfImagePropertiesIF::getImageBandWidthBufferSize() const {
     return static_cast<int>((static_cast<long long>(m_bpp) * m_imageWidth) >> 3);
 }
 
-int CNitfImagePropertiesIF::getImageWidthBufferSize() const { return getImageBandWidthBufferSize() * m_bandCount; }
+int CNitfImagePropertiesIF::getImageWidthBufferSize() const {
+    return getImageBandWidthBufferSize() * m_bandCount;
+}
 
 __int64 CNitfImagePropertiesIF::getImageBandBufferSize() const {
     return static_cast<__int64>(std::ceil(static_cast<double>(m_imageHeight) * m_imageWidth * m_bpp * 0.125));
 }
 
-__int64 CNitfImagePropertiesIF::getImageBufferSize() const { return m_bandCount * getImageBandBufferSize(); }
+__int64 CNitfImagePropertiesIF::getImageBufferSize() const {
+    return m_bandCount * getImageBandBufferSize();
+}
 
 int CNitfImagePropertiesIF::getTileBandWidthBufferSize() const {
     // 12-bit JPEG samples are delivered in two bytes each.
@@ -105,13 +109,17 @@ int CNitfImagePropertiesIF::getTileBandWidthBufferSize() const {
     return static_cast<int>(static_cast<long long>(m_tileWidth) * m_bpp / 8);
 }
 
-int CNitfImagePropertiesIF::getTileWidthBufferSize() const { return m_bandCount * getTileBandWidthBufferSize(); }
+int CNitfImagePropertiesIF::getTileWidthBufferSize() const {
+    return m_bandCount * getTileBandWidthBufferSize();
+}
 
 __int64 CNitfImagePropertiesIF::getTileBandBufferSize() const {
     return static_cast<__int64>(std::ceil(static_cast<double>(m_tileHeight) * m_tileWidth * m_bpp * 0.125));
 }
 
-__int64 CNitfImagePropertiesIF::getTileBufferSize() const { return m_bandCount * getTileBandBufferSize(); }
+__int64 CNitfImagePropertiesIF::getTileBufferSize() const {
+    return m_bandCount * getTileBandBufferSize();
+}
 
 // Replaces an existing field's value with an integer; an absent field stays absent.
 static void replaceField(PropertyMap& map, const char* name, int value) {

@@ -50,7 +50,8 @@ CNitfImageSubheader& CNitfImageSubheader::operator=(const CNitfImageSubheader& o
         m_taggedRecords.push_back(new CNitfTag(*tag));
     for (const auto& entry : other.m_properties) {
         const char* key = entry.first;
-        bool owned = std::find(other.m_ownedNames.begin(), other.m_ownedNames.end(), key) != other.m_ownedNames.end();
+        bool owned =
+            std::find(other.m_ownedNames.begin(), other.m_ownedNames.end(), key) != other.m_ownedNames.end();
         if (owned) {
             m_ownedNames.push_back(HString(key));
             key = m_ownedNames.back();
@@ -66,7 +67,9 @@ CNitfImageSubheader& CNitfImageSubheader::operator=(const CNitfImageSubheader& o
     return *this;
 }
 
-CNitfImageSubheader::~CNitfImageSubheader() { clearContents(); }
+CNitfImageSubheader::~CNitfImageSubheader() {
+    clearContents();
+}
 
 void CNitfImageSubheader::clearContents() {
     for (CDataPointer* comment : m_comments)
@@ -137,7 +140,8 @@ int CNitfImageSubheader::getBandCount() {
     return count;
 }
 
-// ---- reading ------------------------------------------------------------------------------------------------
+// ---- reading
+// ------------------------------------------------------------------------------------------------
 
 void CNitfImageSubheader::readField(FILE* fp, const char* name, int width) {
     SetProperty(m_properties, name, CNitfProperty::getNewFromString(fp, width));
@@ -252,7 +256,7 @@ void CNitfImageSubheader::readBody(FILE* fp, const BodyRules& rules) {
     static const struct {
         const char* name;
         int width;
-    } blocking[] = {{"ISYNC", 1}, {"IMODE", 1}, {"NBPR", 4},  {"NBPC", 4}, {"NPPBH", 4}, {"NPPBV", 4},
+    } blocking[] = {{"ISYNC", 1}, {"IMODE", 1}, {"NBPR", 4},  {"NBPC", 4},  {"NPPBH", 4}, {"NPPBV", 4},
                     {"NBPP", 2},  {"IDLVL", 3}, {"IALVL", 3}, {"ILOC", 10}, {"IMAG", 4}};
     for (const auto& field : blocking)
         readField(fp, field.name, field.width);
@@ -263,7 +267,8 @@ void CNitfImageSubheader::readBody(FILE* fp, const BodyRules& rules) {
     }
 }
 
-// ---- writing ------------------------------------------------------------------------------------------------
+// ---- writing
+// ------------------------------------------------------------------------------------------------
 
 void CNitfImageSubheader::writeFields(FILE* fp, std::initializer_list<std::pair<const char*, int>> fields) {
     for (const auto& field : fields) {
@@ -328,8 +333,17 @@ void CNitfImageSubheader::writeBody(FILE* fp) {
         }
     }
 
-    writeFields(fp, {{"ISYNC", 1}, {"IMODE", 1}, {"NBPR", 4}, {"NBPC", 4}, {"NPPBH", 4}, {"NPPBV", 4}, {"NBPP", 2},
-                 {"IDLVL", 3}, {"IALVL", 3}, {"ILOC", 10}, {"IMAG", 4}});
+    writeFields(fp, {{"ISYNC", 1},
+                     {"IMODE", 1},
+                     {"NBPR", 4},
+                     {"NBPC", 4},
+                     {"NPPBH", 4},
+                     {"NPPBV", 4},
+                     {"NBPP", 2},
+                     {"IDLVL", 3},
+                     {"IALVL", 3},
+                     {"ILOC", 10},
+                     {"IMAG", 4}});
 
     // Every TRE goes into the user-defined area; the extended area is always written empty.
     if (!m_taggedRecords.empty()) {
@@ -363,7 +377,6 @@ __int64 CNitfImageSubheader::computeBodyStorageLength(__int64 fixedLength) {
         length += extended->getAsInt();
     return length;
 }
-
 
 void CNitfImageSubheader::buildTitle(const char* nameField, char* title) {
     std::string text;

@@ -26,4 +26,6 @@ __int64 CNitfImageSubheaderV20::computeStorageLength() {
     return computeBodyStorageLength(headLayout().length(m_properties) + 82 + 1 + 2);
 }
 
-void CNitfImageSubheaderV20::getTitle(char* title) { buildTitle("ITITLE", title); }
+void CNitfImageSubheaderV20::getTitle(char* title) {
+    buildTitle("ITITLE", title);
+}

@@ -9,7 +9,8 @@
 
 // The 2.1 / NSIF identification and security fields between IDATIM and ENCRYP.
 static const CFieldLayout& securityLayout21() {
-    static const CFieldLayout layout = CFieldLayout{{"TGTID", 17}, {"IID2", 80}}.add(CFieldLayout::security21("IS"));
+    static const CFieldLayout layout =
+        CFieldLayout{{"TGTID", 17}, {"IID2", 80}}.add(CFieldLayout::security21("IS"));
     return layout;
 }
 
@@ -31,6 +32,10 @@ void CNitfImageSubheaderV21::write(FILE* fp) {
     writeBody(fp);
 }
 
-__int64 CNitfImageSubheaderV21::computeStorageLength() { return computeBodyStorageLength(375); }
+__int64 CNitfImageSubheaderV21::computeStorageLength() {
+    return computeBodyStorageLength(375);
+}
 
-void CNitfImageSubheaderV21::getTitle(char* title) { buildTitle("IID2", title); }
+void CNitfImageSubheaderV21::getTitle(char* title) {
+    buildTitle("IID2", title);
+}

@@ -26,7 +26,9 @@ int CNitfLutSource::getEntrySize() const {
     }
 }
 
-int CNitfLutSource::getSize() const { return m_entryCount > 0 ? getEntrySize() * m_entryCount : 0; }
+int CNitfLutSource::getSize() const {
+    return m_entryCount > 0 ? getEntrySize() * m_entryCount : 0;
+}
 
 void CNitfLutSource::deinterleave(char* dst, char* src, int entries, int components, int stride) {
     for (int e = 0; e < entries; ++e) {

@@ -8,9 +8,12 @@
 #include "HostMemory.h"
 #include "NitfFile.h"
 
-CNitfSegmentSource::CNitfSegmentSource() : m_subheaderOffset(0), m_dataOffset(0), m_dataLength(0), m_index(-1) {}
+CNitfSegmentSource::CNitfSegmentSource()
+    : m_subheaderOffset(0), m_dataOffset(0), m_dataLength(0), m_index(-1) {}
 
-CNitfSegmentSource::~CNitfSegmentSource() { clearContents(); }
+CNitfSegmentSource::~CNitfSegmentSource() {
+    clearContents();
+}
 
 void CNitfSegmentSource::clearContents() {
     DestroyPropertyMap(m_properties);

@@ -1,0 +1,14 @@
+#include "NitfTestFile.h"
+
+#include <stdexcept>
+
+OpenedSample::OpenedSample(const nitfsample::File& file, const std::string& name)
+    : m_file(new TempFile(nitfsample::build(file), "-" + name)) {
+    if (!m_reader.open(m_file->path().c_str()))
+        throw std::runtime_error("cannot open " + m_file->path());
+}
+
+OpenedSample::OpenedSample(const std::string& bytes) : m_file(new TempFile(bytes)) {
+    if (!m_reader.open(m_file->path().c_str()))
+        throw std::runtime_error("cannot open " + m_file->path());
+}
