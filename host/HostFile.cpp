@@ -108,12 +108,13 @@ __int64 DKFTell(FILE* fp) {
 __int64 DKSize(FILE* fp) {
     if (!fp)
         return -1;
-    // Data still in the stream's buffer belongs to the file as the caller sees it.
-    std::fflush(fp);
+    // No flush: on a stream being read it would throw away the read-ahead buffer, and readers ask for the size
+    // often. Bytes written but not yet flushed end at or before the stream's position, which is counted.
     struct stat info;
     if (fstat(fileno(fp), &info) != 0)
         return -1;
-    return static_cast<__int64>(info.st_size);
+    __int64 position = ftello(fp);
+    return position > info.st_size ? static_cast<__int64>(position) : static_cast<__int64>(info.st_size);
 }
 
 bool DKCheck(const char* name) {

@@ -107,9 +107,15 @@ private:
     eDataType m_type;
 };
 
-// Orders field names by strcmp.
+// Orders field names by strcmp (written out inline: field names are short and maps are searched a lot).
 struct ltstr {
-    bool operator()(const char* a, const char* b) const { return std::strcmp(a, b) < 0; }
+    bool operator()(const char* a, const char* b) const {
+        while (*a && *a == *b) {
+            ++a;
+            ++b;
+        }
+        return static_cast<unsigned char>(*a) < static_cast<unsigned char>(*b);
+    }
 };
 
 // Field name to value. Keys are constant names (not freed with the map); the map's holder owns the values.

@@ -110,13 +110,21 @@ int CNitfImageSubheader::getImageAttachment() {
 }
 
 char* CNitfImageSubheader::bandFieldName(const char* name, int index, int count) {
-    if (count < 10 || count >= 1000)
-        return MkName("%s%d", name, index);
-    if (count < 100)
-        return index < 10 ? MkName("%s0%d", name, index) : MkName("%s%d", name, index);
-    if (index < 10)
-        return MkName("%s00%d", name, index);
-    return index < 100 ? MkName("%s0%d", name, index) : MkName("%s%d", name, index);
+    // Zero-padded to the width of the band count below 1000 bands; from 1000 bands on, not padded at all.
+    int width = count < 10 || count >= 1000 ? 1 : count < 100 ? 2 : 3;
+    char digits[16];
+    int length = 0;
+    for (unsigned value = static_cast<unsigned>(index); value > 0 || length == 0; value /= 10)
+        digits[length++] = static_cast<char>('0' + value % 10);
+    while (length < width)
+        digits[length++] = '0';
+    size_t nameLength = std::strlen(name);
+    char* result = static_cast<char*>(HMalloc(nameLength + length + 1));
+    std::memcpy(result, name, nameLength);
+    for (int i = 0; i < length; ++i)
+        result[nameLength + i] = digits[length - 1 - i];
+    result[nameLength + length] = '\0';
+    return result;
 }
 
 const char* CNitfImageSubheader::ownBandFieldName(const char* name, int index, int count) {
@@ -247,7 +255,7 @@ void CNitfImageSubheader::readBody(FILE* fp, const BodyRules& rules) {
         bands = FindProperty(m_properties, "XBANDS")->getAsInt();
     }
     // Each band takes at least 13 bytes: a count the rest of the file cannot hold is damage, not data.
-    if (bands > 0 && static_cast<__int64>(bands) * 13 > CDataStream::remaining(fp))
+    if (bands > 9 && static_cast<__int64>(bands) * 13 > CDataStream::remaining(fp))
         NITF_RAISE_FORMAT("void __cdecl CNitfImageSubheader::read(" NITF_FILE_SIG ",enum eNitfVersion_t)",
                           "Image band count %d runs past the end of the file", bands);
     for (int band = 1; band <= bands; ++band)

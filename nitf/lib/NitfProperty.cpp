@@ -371,12 +371,10 @@ CNitfProperty* FindProperty(const PropertyMap& map, const char* name) {
 }
 
 void SetProperty(PropertyMap& map, const char* name, CNitfProperty* value) {
-    auto found = map.find(const_cast<char*>(name));
-    if (found == map.end()) {
-        map[const_cast<char*>(name)] = value;
+    auto inserted = map.emplace(const_cast<char*>(name), value);
+    if (inserted.second)
         return;
-    }
-    if (found->second != value)
-        delete found->second;
-    found->second = value;
+    if (inserted.first->second != value)
+        delete inserted.first->second;
+    inserted.first->second = value;
 }

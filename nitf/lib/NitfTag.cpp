@@ -88,9 +88,10 @@ long long CNitfTag::computeListTotalLengths(std::list<CNitfTag*>* list) {
 
 long long CNitfTag::readArea(FILE* fp, long long length, eTagSource_t source, std::list<CNitfTag*>& list,
                              bool number) {
-    long long consumed = 0;
     // Every TRE consumes at least its 11-byte header, so the walk ends; it also ends at the end of the file.
-    while (consumed < length && CDataStream::remaining(fp) >= getSize()) {
+    const long long available = CDataStream::remaining(fp);
+    long long consumed = 0;
+    while (consumed < length && available - consumed >= getSize()) {
         CNitfTag* tag = new CNitfTag;
         tag->setSource(source);
         consumed += tag->read(fp);

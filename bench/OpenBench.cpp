@@ -1,0 +1,54 @@
+// Opening a file and reading every sub-header of a file with 999 image segments and 999 data extensions.
+#include <benchmark/benchmark.h>
+
+#include <memory>
+
+#include "NitfDataExtensionSource.h"
+#include "NitfFileReader.h"
+#include "NitfImageSubheader.h"
+#include "NitfSampleWriter.h"
+#include "TestFiles.h"
+
+namespace {
+
+const TempFile& manySegmentsFile() {
+    static const TempFile file = [] {
+        nitfsample::File sample;
+        for (int i = 0; i < 999; ++i) {
+            nitfsample::Image image;
+            image.rows = image.cols = 2;
+            image.udid = {{"TESTAA", "0123456789"}};
+            sample.images.push_back(image);
+            nitfsample::Des des;
+            des.desid = "TEST_DES";
+            des.data = "x";
+            sample.des.push_back(des);
+        }
+        return TempFile(nitfsample::build(sample));
+    }();
+    return file;
+}
+
+void OpenAndReadEverySubheader(benchmark::State& state) {
+    const std::string& path = manySegmentsFile().path();
+    for (auto _ : state) {
+        CNitfFileReader reader;
+        reader.open(path.c_str());
+        CNitfFileHeader* header = reader.getFileHeader();
+        for (int i = 0; i < reader.getImageCount(); ++i) {
+            std::unique_ptr<CNitfImageSubheader> image(header->getNewImageSubheader(reader.getInputStream(), i));
+            benchmark::DoNotOptimize(image.get());
+        }
+        for (int i = 0; i < reader.getDataExtensionCount(); ++i) {
+            std::unique_ptr<CNitfDataExtensionSource> des(reader.getNewDataExtensionSource(i));
+            benchmark::DoNotOptimize(des.get());
+        }
+    }
+    state.counters["segments"] = benchmark::Counter(1998.0 * static_cast<double>(state.iterations()),
+                                                    benchmark::Counter::kIsRate);
+}
+BENCHMARK(OpenAndReadEverySubheader)->Unit(benchmark::kMillisecond);
+
+} // namespace
+
+BENCHMARK_MAIN();
