@@ -3,3 +3,4 @@
 
 int runSelfCheck(int argc, char** argv);
 int runInfo(int argc, char** argv);
+int runSample(int argc, char** argv);

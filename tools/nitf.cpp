@@ -10,6 +10,7 @@
 static int usage(FILE* out) {
     std::fprintf(out, "usage: nitf --version\n"
                       "       nitf info [--json] FILE  describe the file's headers, segments and TREs\n"
+                      "       nitf sample OUT.ntf      write a small demo NITF 2.1 file\n"
                       "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back\n");
     return out == stdout ? 0 : 2;
 }
@@ -27,6 +28,8 @@ int main(int argc, char** argv) {
             return usage(stdout);
         if (command == "info")
             return runInfo(argc - 2, argv + 2);
+        if (command == "sample")
+            return runSample(argc - 2, argv + 2);
         if (command == "selfcheck")
             return runSelfCheck(argc - 2, argv + 2);
     } catch (const vexo::Exception& e) {
