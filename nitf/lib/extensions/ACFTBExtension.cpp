@@ -1,0 +1,7 @@
+#include "ACFTBExtension.h"
+
+#include "TreTables.h"
+
+void CACFTBExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::ACFTB());
+}

@@ -1,0 +1,7 @@
+#include "AIMIDBExtension.h"
+
+#include "TreTables.h"
+
+void CAIMIDBExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::AIMIDB());
+}

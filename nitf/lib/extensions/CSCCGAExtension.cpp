@@ -1,0 +1,7 @@
+#include "CSCCGAExtension.h"
+
+#include "TreTables.h"
+
+void CCSCCGAExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::CSCCGA());
+}

@@ -1,0 +1,7 @@
+#include "CSPROAExtension.h"
+
+#include "TreTables.h"
+
+void CCSPROAExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::CSPROA());
+}

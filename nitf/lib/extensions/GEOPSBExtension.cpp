@@ -1,0 +1,7 @@
+#include "GEOPSBExtension.h"
+
+#include "TreTables.h"
+
+void CGEOPSBExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::GEOPSB());
+}

@@ -1,0 +1,7 @@
+#include "IMXDTGExtension.h"
+
+#include "TreTables.h"
+
+void CIMXDTGExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::IMXDTG());
+}

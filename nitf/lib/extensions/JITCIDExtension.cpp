@@ -1,0 +1,7 @@
+#include "JITCIDExtension.h"
+
+#include "TreTables.h"
+
+void CJITCIDExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::JITCID());
+}

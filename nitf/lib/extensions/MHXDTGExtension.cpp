@@ -1,0 +1,7 @@
+#include "MHXDTGExtension.h"
+
+#include "TreTables.h"
+
+void CMHXDTGExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::MHXDTG());
+}

@@ -1,0 +1,7 @@
+#include "MSTGTAExtension.h"
+
+#include "TreTables.h"
+
+void CMSTGTAExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::MSTGTA());
+}

@@ -1,0 +1,7 @@
+#include "PIAPEAExtension.h"
+
+#include "TreTables.h"
+
+void CPIAPEAExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::PIAPEA());
+}

@@ -1,0 +1,7 @@
+#include "PIATGAExtension.h"
+
+#include "TreTables.h"
+
+void CPIATGAExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::PIATGA());
+}

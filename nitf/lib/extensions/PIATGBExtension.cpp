@@ -1,0 +1,7 @@
+#include "PIATGBExtension.h"
+
+#include "TreTables.h"
+
+void CPIATGBExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::PIATGB());
+}

@@ -1,0 +1,7 @@
+#include "TESTINExtension.h"
+
+#include "TreTables.h"
+
+void CTESTINExtension::readInfo(FILE* fp) {
+    readLayout(fp, tre::layouts::TESTIN());
+}
