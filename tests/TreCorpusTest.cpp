@@ -14,25 +14,14 @@
 #include <vector>
 
 #include "HostConfig.h"
-#include "MiniJson.h"
+#include "Manifest.h"
 #include "NitfExtension.h"
 #include "NitfTag.h"
+#include "TestFiles.h"
 
 namespace {
 
-std::string corpusRoot() {
-    struct stat info;
-    const char* fromEnvironment = std::getenv("NITF_TEST_DATA");
-    std::string root = fromEnvironment ? fromEnvironment : NITF_SOURCE_DIR "/../shared/testdata";
-    return stat((root + "/MANIFEST.json").c_str(), &info) == 0 ? root : std::string();
-}
-
-std::string readFile(const std::string& path) {
-    std::ifstream in(path, std::ios::binary);
-    std::ostringstream out;
-    out << in.rdbuf();
-    return out.str();
-}
+using nlohmann::json;
 
 std::string trimmed(const std::string& text) {
     return text.substr(0, text.find_last_not_of(' ') + 1);
@@ -48,15 +37,15 @@ struct Occurrence {
 
 // Finds the TREs `tres` lists (objects with tag and length, or bare tags) in file order within bytes
 // [begin, end) of the file, each by its 11-byte header.
-void locate(const std::string& file, const std::string& bytes, const JsonValue& tres, long long begin,
-            long long end, std::vector<Occurrence>& found) {
+void locate(const std::string& file, const std::string& bytes, const json& tres, long long begin, long long end,
+            std::vector<Occurrence>& found) {
     long long cursor = begin;
-    for (const JsonValue& tre : tres.items()) {
-        std::string tag = tre.isString() ? tre.string() : tre["tag"].string();
+    for (const json& tre : tres) {
+        std::string tag = tre.is_string() ? tre.get<std::string>() : tre["tag"].get<std::string>();
         std::string header = tag + std::string(6 - tag.size(), ' ');
         long long length = -1;
-        if (!tre.isString()) {
-            length = tre["length"].integer();
+        if (!tre.is_string()) {
+            length = tre["length"].get<long long>();
             char digits[8];
             std::snprintf(digits, sizeof digits, "%05lld", length);
             header += digits;
@@ -71,34 +60,37 @@ void locate(const std::string& file, const std::string& bytes, const JsonValue& 
     }
 }
 
-std::vector<Occurrence> corpusTres(const std::string& root, const JsonValue& manifest) {
+std::vector<Occurrence> corpusTres() {
+    static const json none = json::array();
     std::vector<Occurrence> found;
-    for (const auto& entry : manifest["files"].members()) {
-        const std::string& file = entry.first;
-        const JsonValue& facts = entry.second;
-        const JsonValue& header = facts["file"];
-        if (facts["malformed"].boolean() || !header.isObject())
+    for (const CorpusFile& corpusFile : Manifest::get().wellFormed()) {
+        const std::string& file = corpusFile.relative;
+        const json& facts = *corpusFile.entry;
+        if (!facts.contains("file") || !facts["file"].contains("HL"))
             continue;
-        std::string bytes = readFile(root + "/" + file);
+        const json& header = facts["file"];
+        std::string bytes = readWholeFile(corpusFile.path);
         long long size = static_cast<long long>(bytes.size());
-        locate(file, bytes, header["tres"], 0, header["HL"].integer(), found);
-        for (const JsonValue& image : facts["images"].items())
-            locate(file, bytes, image["tres"], image["subheader_offset"].integer(),
-                   image["subheader_offset"].integer() + image["subheader_length"].integer(), found);
+        auto span = [](const json& place) {
+            long long start = place["subheader_offset"].get<long long>();
+            return std::make_pair(start, start + place["subheader_length"].get<long long>());
+        };
+        locate(file, bytes, header["tres"], 0, header["HL"].get<long long>(), found);
+        for (const json& image : facts.value("images", none))
+            locate(file, bytes, image.value("tres", none), span(image).first, span(image).second, found);
         // Graphic, text and DES facts come in the order of the header's segment table.
         const std::pair<const char*, const char*> kinds[] = {{"graphics", "graphic"}, {"texts", "text"}};
         for (const auto& kind : kinds) {
-            const auto& segments = facts[kind.first].items();
+            const json& segments = facts.value(kind.first, none);
             for (size_t i = 0; i < segments.size(); ++i) {
-                const JsonValue& place = header["segments"][kind.second].items().at(i);
-                locate(file, bytes, segments[i]["tres"], place["subheader_offset"].integer(),
-                       place["subheader_offset"].integer() + place["subheader_length"].integer(), found);
+                auto place = span(header["segments"][kind.second].at(i));
+                locate(file, bytes, segments[i].value("tres", none), place.first, place.second, found);
             }
         }
-        const auto& des = facts["des"].items();
+        const json& des = facts.value("des", none);
         for (size_t i = 0; i < des.size(); ++i) {
-            const JsonValue& place = header["segments"]["des"].items().at(i);
-            locate(file, bytes, des[i]["tres"], place["data_offset"].integer(), size, found);
+            long long start = header["segments"]["des"].at(i)["data_offset"].get<long long>();
+            locate(file, bytes, des[i].value("tres", none), start, size, found);
         }
     }
     return found;
@@ -131,10 +123,9 @@ class TreCorpus : public ::testing::Test {
 protected:
     void SetUp() override {
         m_root = corpusRoot();
-        if (m_root.empty())
+        if (Manifest::get().empty())
             GTEST_SKIP() << "no test corpus (set NITF_TEST_DATA)";
-        JsonValue manifest = JsonValue::parse(readFile(m_root + "/MANIFEST.json"));
-        m_tres = corpusTres(m_root, manifest);
+        m_tres = corpusTres();
     }
 
     std::string m_root;
@@ -193,7 +184,7 @@ TEST_F(TreCorpus, MetadataMatchesTheBytes) {
         std::string name = trimmed(tre.tag);
         if (name != "AIMIDB" && name != "J2KLRA" && name != "MHUDTG")
             continue;
-        std::string data = readFile(m_root + "/" + tre.file).substr(tre.offset, tre.length);
+        std::string data = readWholeFile(m_root + "/" + tre.file).substr(tre.offset, tre.length);
         Metadata metadata;
         parse(m_root, tre)->asMetadata(metadata.list, "IMAGE", "_1");
         std::string prefix = "IMAGE." + name + "_1.";
