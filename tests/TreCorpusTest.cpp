@@ -37,8 +37,8 @@ struct Occurrence {
 
 // Finds the TREs `tres` lists (objects with tag and length, or bare tags) in file order within bytes
 // [begin, end) of the file, each by its 11-byte header.
-void locate(const std::string& file, const std::string& bytes, const json& tres, long long begin, long long end,
-            std::vector<Occurrence>& found) {
+void locate(const std::string& file, const std::string& bytes, const json& tres, long long begin,
+            long long end, std::vector<Occurrence>& found) {
     long long cursor = begin;
     for (const json& tre : tres) {
         std::string tag = tre.is_string() ? tre.get<std::string>() : tre["tag"].get<std::string>();

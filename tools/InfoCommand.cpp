@@ -8,10 +8,12 @@
 #include <vector>
 
 #include "Commands.h"
+#include "HostConfig.h"
 #include "HostError.h"
 #include "HostFile.h"
 #include "JsonWriter.h"
 #include "NitfDataExtensionSource.h"
+#include "NitfExtension.h"
 #include "NitfFileHeader.h"
 #include "NitfFileReader.h"
 #include "NitfImagePropertiesIF.h"
@@ -28,6 +30,8 @@ struct TreEntry {
     int source;
     int occurrence;
     int total;
+    std::vector<std::pair<std::string, std::string>> fields; // parsed fields, "TRE.FIELD" keys
+    std::string error;
 };
 
 // One header or sub-header: its fields in file order, its TREs, and summary lines for the text form.
@@ -72,15 +76,44 @@ void addFields(Section& section, PropertyMap& map, const std::vector<const char*
         section.fields.emplace_back(name, fieldText(FindProperty(map, name)));
 }
 
-void addTres(Section& section, const std::list<CNitfTag*>& tags) {
-    for (const CNitfTag* tag : tags)
-        section.tres.push_back({trimmed(tag->getIdentifier()), tag->getDataLength(), tag->getSource(),
-                                tag->getOccurrence(), tag->getTotal()});
+// The fields of a TRE the library parses, as its metadata entries.
+void parseTre(CNitfTag* tag, FILE* fp, TreEntry& entry) {
+    std::unique_ptr<CNitfExtension> extension(CNitfExtension::Build(tag));
+    if (!extension)
+        return;
+    char** list = nullptr;
+    try {
+        extension->readNewInfo(fp, false);
+        extension->asMetadata(list, nullptr, nullptr);
+    } catch (const vexo::Exception& e) {
+        entry.error = e.what();
+    }
+    for (int i = 0; list && list[i]; ++i) {
+        std::string item = list[i];
+        size_t equals = item.find('=');
+        entry.fields.emplace_back(item.substr(0, equals),
+                                  equals == std::string::npos ? "" : trimmed(item.substr(equals + 1)));
+    }
+    DestroyStringList(list);
+}
+
+void addTres(Section& section, const std::list<CNitfTag*>& tags, FILE* fp) {
+    for (CNitfTag* tag : tags) {
+        TreEntry entry{trimmed(tag->getIdentifier()),
+                       tag->getDataLength(),
+                       tag->getSource(),
+                       tag->getOccurrence(),
+                       tag->getTotal(),
+                       {},
+                       {}};
+        parseTre(tag, fp, entry);
+        section.tres.push_back(entry);
+    }
 }
 
 // The file header's fields, with each segment table's lengths right after its count, as they stand in the
 // file.
-Section describeHeader(CNitfFileHeader* header) {
+Section describeHeader(CNitfFileHeader* header, FILE* fp) {
     struct Table {
         const char* count;
         const char* headerName;
@@ -111,14 +144,14 @@ Section describeHeader(CNitfFileHeader* header) {
             }
         }
     }
-    addTres(section, header->getTaggedRecords());
+    addTres(section, header->getTaggedRecords(), fp);
     return section;
 }
 
 Section describeImage(CNitfImageSubheader* subheader, FILE* fp) {
     Section section;
     addFields(section, subheader->getProperties(), subheader->getFieldNames());
-    addTres(section, subheader->getTaggedRecords());
+    addTres(section, subheader->getTaggedRecords(), fp);
 
     CNitfImagePropertiesIF geometry;
     PropertyMap& map = subheader->getProperties();
@@ -157,19 +190,19 @@ Section describeImage(CNitfImageSubheader* subheader, FILE* fp) {
     return section;
 }
 
-Section describeSegment(CNitfSegmentSource& segment) {
+Section describeSegment(CNitfSegmentSource& segment, FILE* fp) {
     Section section;
     addFields(section, segment.getProperties(), segment.getFieldNames());
-    addTres(section, segment.getTaggedRecords());
+    addTres(section, segment.getTaggedRecords(), fp);
     section.summary.push_back(
         format("data: %lld bytes at offset %lld", segment.getDataLength(), segment.getDataOffset()));
     return section;
 }
 
-Section describeDes(CNitfDataExtensionSource& des) {
-    Section section = describeSegment(des);
+Section describeDes(CNitfDataExtensionSource& des, FILE* fp) {
+    Section section = describeSegment(des, fp);
     section.tres.clear();
-    addTres(section, des.getOverflowTags());
+    addTres(section, des.getOverflowTags(), fp);
     if (des.isOverflow())
         section.summary.push_back(
             format("TRE overflow: %lld TRE(s)", static_cast<long long>(des.getOverflowTags().size())));
@@ -206,7 +239,7 @@ FileInfo collect(const char* path) {
     // Overflow segments first: their TREs join the lists of the headers they overflowed from.
     for (int i = 0; i < info.counts[4]; ++i) {
         std::unique_ptr<CNitfDataExtensionSource> des(reader.getNewDataExtensionSource(i));
-        info.des.push_back(describeDes(*des));
+        info.des.push_back(describeDes(*des, fp));
     }
     for (int i = 0; i < info.counts[0]; ++i) {
         std::unique_ptr<CNitfImageSubheader> subheader(header->getNewImageSubheader(fp, i));
@@ -214,17 +247,17 @@ FileInfo collect(const char* path) {
     }
     for (int i = 0; i < info.counts[1]; ++i) {
         std::unique_ptr<CNitfSymbolSource> graphic(reader.getNewSymbolSource(i));
-        info.graphics.push_back(describeSegment(*graphic));
+        info.graphics.push_back(describeSegment(*graphic, fp));
     }
     for (int i = 0; i < info.counts[2]; ++i) {
         std::unique_ptr<CNitfLabelSource> label(reader.getNewLabelSource(i));
-        info.labels.push_back(describeSegment(*label));
+        info.labels.push_back(describeSegment(*label, fp));
     }
     for (int i = 0; i < info.counts[3]; ++i) {
         std::unique_ptr<CNitfTextSource> text(reader.getNewTextSource(i));
-        info.texts.push_back(describeSegment(*text));
+        info.texts.push_back(describeSegment(*text, fp));
     }
-    info.header = describeHeader(header);
+    info.header = describeHeader(header, fp);
     return info;
 }
 
@@ -240,6 +273,14 @@ void writeTres(JsonWriter& json, const std::vector<TreEntry>& tres) {
         json.value("source", static_cast<long long>(tre.source));
         json.value("occurrence", static_cast<long long>(tre.occurrence));
         json.value("total", static_cast<long long>(tre.total));
+        if (!tre.fields.empty()) {
+            json.beginObject("fields");
+            for (const auto& field : tre.fields)
+                json.value(field.first.c_str(), field.second);
+            json.endObject();
+        }
+        if (!tre.error.empty())
+            json.value("error", tre.error);
         json.endObject();
     }
     json.endArray();
@@ -302,6 +343,14 @@ void printSection(const Section& section, const char* indent) {
         if (tre.occurrence)
             std::printf(", occurrence %d of %d", tre.occurrence, tre.total);
         std::printf("\n");
+        size_t width = 0;
+        for (const auto& field : tre.fields)
+            width = std::max(width, field.first.size());
+        for (const auto& field : tre.fields)
+            std::printf("%s      %-*s  %s\n", indent, static_cast<int>(width), field.first.c_str(),
+                        field.second.c_str());
+        if (!tre.error.empty())
+            std::printf("%s      (not parsed: %s)\n", indent, tre.error.c_str());
     }
 }
 

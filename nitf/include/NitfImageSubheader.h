@@ -60,6 +60,15 @@ public:
     bool hasExtensionRpfImg() { return hasTag("RPFIMG"); }
     bool hasExtensionRpc() { return hasTag("RPC00B") || hasTag("RPC00A"); }
 
+    // New parsers placed on the segment's TRE (null when it is absent); the caller owns them and reads them
+    // with readNewInfo.
+    CMAPLOBExtension* getMAPLOBExtension();
+    CRPFIMGExtension* getRpfImgExtension();
+    // A rational polynomial source on "RPC00B", else on "RPC00A"; null when neither is present.
+    CRpcSource* getNewExtensionRpcSource();
+    // Appends an image TRE entry for an RPC TRE ("RPC00B" when `name` is null) sized for its storage.
+    void addExtensionRpcSource(const char* name);
+
     // Per-band field names: the field name and the band number (from 1), zero-padded to the width of the band
     // count for counts below 1000, unpadded from 1000 bands on. Released with free().
     static char* bandFieldName(const char* name, int index, int count);

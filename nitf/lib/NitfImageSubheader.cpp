@@ -8,6 +8,9 @@
 #include "DataStreamWrite.h"
 #include "HostFile.h"
 #include "HostMemory.h"
+#include "MAPLOBExtension.h"
+#include "RPFIMGExtension.h"
+#include "RpcSource.h"
 #include "Raise.h"
 
 static const char kSourceFile[] = "nitf/lib/NitfImageSubheader";
@@ -100,6 +103,38 @@ CNitfLutSource* CNitfImageSubheader::getLutSource(int index) {
 CNitfLutSource* CNitfImageSubheader::addNewLutSource() {
     m_luts.push_back(new CNitfLutSource);
     return m_luts.back();
+}
+
+template <typename Extension> static Extension* preparedOn(CNitfTag* tag) {
+    if (!tag)
+        return nullptr;
+    Extension* extension = new Extension;
+    extension->prepare(tag);
+    return extension;
+}
+
+CMAPLOBExtension* CNitfImageSubheader::getMAPLOBExtension() {
+    return preparedOn<CMAPLOBExtension>(CNitfTag::find("MAPLOB", m_taggedRecords));
+}
+
+CRPFIMGExtension* CNitfImageSubheader::getRpfImgExtension() {
+    return preparedOn<CRPFIMGExtension>(CNitfTag::find("RPFIMG", m_taggedRecords));
+}
+
+CRpcSource* CNitfImageSubheader::getNewExtensionRpcSource() {
+    CNitfTag* tag = CNitfTag::find("RPC00B", m_taggedRecords);
+    if (!tag)
+        tag = CNitfTag::find("RPC00A", m_taggedRecords);
+    return tag ? new CRpcSource(tag) : nullptr;
+}
+
+void CNitfImageSubheader::addExtensionRpcSource(const char* name) {
+    const char* identifier = name ? name : "RPC00B";
+    CNitfTag* tag = new CNitfTag;
+    tag->setIdentifier(identifier);
+    tag->setSource(CNitfTag::eTagSourceImage);
+    tag->setDataLength(CRpcSource(identifier).computeStorageLength());
+    m_taggedRecords.push_back(tag);
 }
 
 int CNitfImageSubheader::getImageAttachment() {
