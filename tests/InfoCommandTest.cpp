@@ -1,0 +1,123 @@
+// `nitf info --json` reproduces what the manifest recorded about every corpus file, and prints header fields
+// in file order.
+#include <gtest/gtest.h>
+
+#include <cstdio>
+#include <string>
+
+#include "Manifest.h"
+#include "NitfSampleWriter.h"
+#include "TestFiles.h"
+
+namespace {
+
+using nlohmann::json;
+
+// Runs the tool and returns its standard output; `status` receives the exit status.
+std::string runTool(const std::string& arguments, int& status) {
+    std::string command = std::string(NITF_TOOL_PATH) + " " + arguments + " 2>/dev/null";
+    FILE* pipe = popen(command.c_str(), "r");
+    std::string output;
+    char buffer[65536];
+    size_t got;
+    while ((got = std::fread(buffer, 1, sizeof buffer, pipe)) > 0)
+        output.append(buffer, got);
+    status = pclose(pipe);
+    return output;
+}
+
+json infoOf(const std::string& path) {
+    int status = 0;
+    std::string output = runTool("info --json '" + path + "'", status);
+    EXPECT_EQ(status, 0) << path;
+    return json::parse(output);
+}
+
+std::string trimmed(std::string text) {
+    text.erase(text.find_last_not_of(' ') + 1);
+    return text;
+}
+
+void checkTres(const json& expected, const json& actual, bool fileHeaderOnly, const std::string& what) {
+    std::vector<const json*> listed;
+    for (const json& tre : actual) {
+        if (!fileHeaderOnly || tre["source"] == 1)
+            listed.push_back(&tre);
+    }
+    ASSERT_EQ(listed.size(), expected.size()) << what;
+    for (size_t i = 0; i < expected.size(); ++i) {
+        std::string tag =
+            expected[i].is_string() ? expected[i].get<std::string>() : expected[i]["tag"].get<std::string>();
+        EXPECT_EQ((*listed[i])["tag"], trimmed(tag)) << what << " " << i;
+        if (expected[i].is_object()) {
+            EXPECT_EQ((*listed[i])["length"], expected[i]["length"]) << what << " " << i;
+        }
+    }
+}
+
+} // namespace
+
+TEST(InfoCommand, JsonMatchesTheManifestForEveryCorpusFile) {
+    const Manifest& manifest = Manifest::get();
+    if (manifest.empty())
+        GTEST_SKIP() << "no test corpus";
+    static const json none = json::array();
+    for (const CorpusFile& file : manifest.wellFormed()) {
+        const json& entry = *file.entry;
+        if (!entry.contains("file") || !entry["file"].contains("FHDR"))
+            continue;
+        SCOPED_TRACE(file.relative);
+        json info = infoOf(file.path);
+        EXPECT_EQ(info["version"], entry["file"]["FHDR"]);
+        const json& segments = entry["file"]["segments"];
+        for (const char* kind : {"image", "graphic", "label", "text", "des", "res"}) {
+            size_t expected = segments.contains(kind) ? segments[kind].size() : 0;
+            EXPECT_EQ(info["segments"][kind], expected) << kind;
+        }
+        checkTres(entry["file"]["tres"], info["tres"], true, "file");
+        const json& graphics = entry.value("graphics", none);
+        for (size_t i = 0; i < graphics.size(); ++i)
+            EXPECT_EQ(info["graphics"][i]["subheader"]["SID"], graphics[i]["SID"]);
+        const json& labels = entry.value("labels", none);
+        for (size_t i = 0; i < labels.size(); ++i)
+            EXPECT_EQ(info["labels"][i]["subheader"]["LID"], labels[i]["LID"]);
+        const json& texts = entry.value("texts", none);
+        for (size_t i = 0; i < texts.size(); ++i)
+            EXPECT_EQ(info["texts"][i]["subheader"]["TEXTID"], texts[i]["TEXTID"]);
+        const json& des = entry.value("des", none);
+        for (size_t i = 0; i < des.size(); ++i) {
+            const json& subheader = info["des"][i]["subheader"];
+            EXPECT_EQ(subheader.contains("DESID") ? subheader["DESID"] : subheader["DESTAG"],
+                      des[i]["DESID"]);
+            // Label overflow is deliberately not read.
+            if (des[i].contains("tres") && des[i].value("DESOFLW", "") != "LXSHD")
+                checkTres(des[i]["tres"], info["des"][i]["tres"], false, "DES " + std::to_string(i));
+        }
+    }
+}
+
+TEST(InfoCommand, HeaderFieldsComeInFileOrderAndErrorsGoToStderr) {
+    nitfsample::File file = nitfsample::defaultSample();
+    file.fbkgc = std::string("\x12\xAB\x00", 3);
+    TempFile sample(nitfsample::build(file));
+    json info = infoOf(sample.path());
+    EXPECT_EQ(info["versionCode"], 2);
+    std::vector<std::string> order; // the parser above sorts keys: read them again in document order
+    int status = 0;
+    nlohmann::ordered_json ordered =
+        nlohmann::ordered_json::parse(runTool("info --json '" + sample.path() + "'", status));
+    for (auto& item : ordered["header"].items())
+        order.push_back(item.key());
+    ASSERT_GE(order.size(), 8u);
+    EXPECT_EQ(order[0], "FHDR");
+    EXPECT_EQ(order[1], "CLEVEL");
+    EXPECT_EQ(info["header"]["FBKGC"], "12AB00");
+    EXPECT_EQ(info["header"]["LISH001"].get<std::string>().size(), 6u);
+    ASSERT_EQ(info["tres"].size(), 1u);
+    EXPECT_TRUE(info["tres"][0].contains("fields")) << "a TRE the library parses shows its fields";
+
+    TempFile garbage("NOT A NITF FILE AT ALL");
+    std::string output = runTool("info --json '" + garbage.path() + "'", status);
+    EXPECT_NE(status, 0);
+    EXPECT_TRUE(output.empty()) << "errors never reach standard output";
+}
