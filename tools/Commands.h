@@ -2,3 +2,4 @@
 #pragma once
 
 int runSelfCheck(int argc, char** argv);
+int runExtract(int argc, char** argv);

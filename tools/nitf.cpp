@@ -9,7 +9,8 @@
 
 static int usage(FILE* out) {
     std::fprintf(out, "usage: nitf --version\n"
-                      "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back\n");
+                      "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back\n"
+                      "       nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm -o OUT\n");
     return out == stdout ? 0 : 2;
 }
 
@@ -26,6 +27,8 @@ int main(int argc, char** argv) {
             return usage(stdout);
         if (command == "selfcheck")
             return runSelfCheck(argc - 2, argv + 2);
+        if (command == "extract")
+            return runExtract(argc - 2, argv + 2);
     } catch (const vexo::Exception& e) {
         std::fprintf(stderr, "nitf: %s\n", e.what());
         return 1;
