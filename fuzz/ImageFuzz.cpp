@@ -29,7 +29,6 @@ const std::string& scratchPath() {
         int fd = mkstemp(&pattern[0]);
         if (fd >= 0)
             close(fd);
-        std::atexit([] { std::remove(scratchPath().c_str()); });
         return pattern;
     }();
     return path;
@@ -78,13 +77,16 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     std::fwrite(data, 1, size, out);
     std::fclose(out);
 
+    // The name is removed once the file is open, so that no scratch file outlives the run.
     CNitfFileReader reader;
+    bool opened = false;
     try {
-        if (!reader.open(path.c_str()))
-            return 0;
+        opened = reader.open(path.c_str()) != nullptr;
     } catch (const vexo::Exception&) {
-        return 0;
     }
+    std::remove(path.c_str());
+    if (!opened)
+        return 0;
     for (int index = 0; index < std::min(reader.getImageCount(), 32); ++index) {
         try {
             readImage(reader, index);
