@@ -8,17 +8,14 @@
 #include "NitfVersion.h"
 
 static int usage(FILE* out) {
-    std::fprintf(out, "usage: nitf --version\n"
-                      "       nitf info [--json] FILE  describe the file's headers, segments and TREs
-"
-                      "       nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm -o OUT
-"
-                      "                                decode an image (default 0) to canonical raw bytes or a picture
-"
-                      "       nitf sample OUT.ntf      write a small demo NITF 2.1 file
-"
-                      "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back
-");
+    std::fprintf(
+        out,
+        "usage: nitf --version\n"
+        "       nitf info [--json] FILE  describe the file's headers, segments and TREs\n"
+        "       nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm -o OUT\n"
+        "                                decode an image (default 0) to canonical raw bytes or a picture\n"
+        "       nitf sample OUT.ntf      write a small demo NITF 2.1 file\n"
+        "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back\n");
     return out == stdout ? 0 : 2;
 }
 
