@@ -13,7 +13,7 @@
 #include "NitfTag.h"
 #include "PIAEVAExtension.h"
 #include "RPFIMGExtension.h"
-#include "ScratchStream.h"
+#include "TestFiles.h"
 #include "TreBytes.h"
 
 namespace {
@@ -116,7 +116,7 @@ TEST(ExtensionFramework, MetadataKeysAndValues) {
 
 TEST(ExtensionFramework, CopiesShareUntilOneRereads) {
     std::string file = kEvent + padText("FLOOD", 38) + padText("DISASTER", 8);
-    ScratchStream stream(file);
+    ByteStream stream(file);
     CNitfTag first, second;
     first.setIdentifier("PIAEVA");
     first.setDataLength(46);
@@ -148,7 +148,7 @@ TEST(ExtensionFramework, RereadingReplacesValuesAndKeepsKeys) {
     std::string one = padText("P", 80) + "AB" + "2" + padNumber(1, 15) + padNumber(2, 15) + padNumber(3, 15) +
                       padNumber(4, 15);
     std::string two = padText("Q", 80) + "AB" + "1" + padNumber(9, 15) + padNumber(5, 15) + padNumber(6, 15);
-    ScratchStream stream(one + two);
+    ByteStream stream(one + two);
     CNitfTag tag;
     tag.setIdentifier("PRJPSB");
     tag.setDataLength(static_cast<long long>(one.size()));
@@ -177,7 +177,7 @@ TEST(ExtensionFramework, ReadsThroughTheFileAndZeroLengthReadsNothing) {
         void close() override {}
         CNitfFileHeader* getFileHeader() override { return nullptr; }
     };
-    ScratchStream stream("xxxx" + kEvent);
+    ByteStream stream("xxxx" + kEvent);
     File file(stream.get());
     auto event = build("PIAEVA", 4, 46);
     event->readNewInfo(&file, true);

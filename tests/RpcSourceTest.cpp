@@ -8,7 +8,7 @@
 #include "HostError.h"
 #include "NitfTag.h"
 #include "RpcSource.h"
-#include "ScratchStream.h"
+#include "TestFiles.h"
 #include "TreBytes.h"
 
 namespace {
@@ -52,7 +52,7 @@ std::string model(int sampleTerm) {
 }
 
 CRpcSource read(const char* name, const std::string& data, long long length = 1041) {
-    ScratchStream stream("pad" + data);
+    ByteStream stream("pad" + data);
     CNitfTag tag;
     tag.setIdentifier(name);
     tag.setDataOffset(3);

@@ -8,7 +8,7 @@
 
 #include "HostError.h"
 #include "NitfTag.h"
-#include "ScratchStream.h"
+#include "TestFiles.h"
 #include "TreBytes.h"
 #include "extensions/TreLayout.h"
 

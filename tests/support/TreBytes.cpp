@@ -4,7 +4,7 @@
 #include <stdexcept>
 
 #include "NitfTag.h"
-#include "ScratchStream.h"
+#include "TestFiles.h"
 
 std::string padText(const std::string& text, size_t width) {
     std::string out = text.substr(0, width);
@@ -26,7 +26,7 @@ std::string bigEndian(unsigned long long value, size_t width) {
 
 std::unique_ptr<CNitfExtension> parseTre(const char* name, const std::string& file, long long length,
                                          long long offset) {
-    ScratchStream stream(file);
+    ByteStream stream(file);
     CNitfTag tag;
     tag.setIdentifier(name);
     tag.setDataOffset(offset);
