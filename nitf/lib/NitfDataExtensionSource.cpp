@@ -79,29 +79,33 @@ void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FIL
     constructor();
     fp = positionAtSubheader(file, fp);
 
-    CFieldLayout{{"DE", 2}}.read(fp, m_properties, &m_fieldNames);
+    static const CFieldLayout head20{{"DE", 2}, {"DESTAG", 25}, {"DESVER", 2}};
+    static const CFieldLayout head21{{"DE", 2}, {"DESID", 25}, {"DESVER", 2}};
+    static const CFieldLayout overflow{{"DESOFLW", 6}, {"DESITEM", 3}};
+    static const CFieldLayout userFields{{"DESSHL", 4},
+                                         {"DESSHF", 0, FieldForm::Text, whenNotZero("DESSHL"), "DESSHL"}};
+    static const CFieldLayout shapeLength{{"DESSHL", 4}};
+
     if (version == eNitfVersion20) {
-        CFieldLayout{{"DESTAG", 25}}.read(fp, m_properties, &m_fieldNames);
+        head20.read(fp, m_properties, &m_fieldNames);
         m_overflow = fieldEquals(m_properties, "DESTAG", "Registered Extensions", 25) ||
                      fieldEquals(m_properties, "DESTAG", "Controlled Extensions", 25);
     } else {
-        CFieldLayout{{"DESID", 25}}.read(fp, m_properties, &m_fieldNames);
+        head21.read(fp, m_properties, &m_fieldNames);
         m_streaming = fieldEquals(m_properties, "DESID", "STREAMING_FILE_HEADER", 25);
         m_overflow = fieldEquals(m_properties, "DESID", "TRE_OVERFLOW", 25);
         m_cloudShape = fieldEquals(m_properties, "DESID", "CSSHPA DES", 25);
     }
-    CFieldLayout{{"DESVER", 2}}.read(fp, m_properties, &m_fieldNames);
     securityLayout(version).read(fp, m_properties, &m_fieldNames);
-    if (m_overflow) {
-        // DESITEM names the overflowed segment; the TREs are attached by area, not by item.
-        CFieldLayout{{"DESOFLW", 6}, {"DESITEM", 3}}.read(fp, m_properties, &m_fieldNames);
-    }
-    CFieldLayout{{"DESSHL", 4}}.read(fp, m_properties, &m_fieldNames);
-    if (m_cloudShape)
+    // DESITEM names the overflowed segment; the TREs are attached by area, not by item.
+    if (m_overflow)
+        overflow.read(fp, m_properties, &m_fieldNames);
+    if (m_cloudShape) {
+        shapeLength.read(fp, m_properties, &m_fieldNames);
         cloudShapeLayout().read(fp, m_properties, &m_fieldNames);
-    else
-        CFieldLayout{{"DESSHF", 0, FieldForm::Text, whenNotZero("DESSHL"), "DESSHL"}}.read(fp, m_properties,
-                                                                                           &m_fieldNames);
+    } else {
+        userFields.read(fp, m_properties, &m_fieldNames);
+    }
 
     if (m_streaming) {
         readStreamingHeader(fp);
@@ -112,7 +116,9 @@ void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FIL
 }
 
 void CNitfDataExtensionSource::readStreamingHeader(FILE* fp) {
-    CFieldLayout{{"SFH_L1", 7}, {"SFH_DELIM1", 4, FieldForm::Binary4}}.read(fp, m_properties, &m_fieldNames);
+    static const CFieldLayout lead{{"SFH_L1", 7}, {"SFH_DELIM1", 4, FieldForm::Binary4}};
+    static const CFieldLayout trail{{"SFH_DELIM2", 4, FieldForm::Binary4}, {"SFH_L2", 7}};
+    lead.read(fp, m_properties, &m_fieldNames);
     int length = FindProperty(m_properties, "SFH_L1")->getAsInt();
     if (length < 0)
         length = 0;
@@ -121,7 +127,7 @@ void CNitfDataExtensionSource::readStreamingHeader(FILE* fp) {
     m_streamingHeader = static_cast<char*>(HMalloc(length > 0 ? length : 1));
     size_t got = DKFRead(m_streamingHeader, 1, length, fp);
     std::memset(m_streamingHeader + got, 0, length - got);
-    CFieldLayout{{"SFH_DELIM2", 4, FieldForm::Binary4}, {"SFH_L2", 7}}.read(fp, m_properties, &m_fieldNames);
+    trail.read(fp, m_properties, &m_fieldNames);
     // Leave the stream at the first byte of the replacement header.
     DKFSeek64(fp, -(11 + static_cast<__int64>(length)), SEEK_CUR);
 }

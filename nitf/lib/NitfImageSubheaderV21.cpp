@@ -16,9 +16,11 @@ static const CFieldLayout& securityLayout21() {
 
 void CNitfImageSubheaderV21::read(FILE* fp, eNitfVersion_t version) {
     clearContents();
-    CFieldLayout{{"IM", 2}, {"IID1", 10}, {"IDATIM", 14}}.read(fp, m_properties, &m_fieldNames);
+    static const CFieldLayout head{{"IM", 2}, {"IID1", 10}, {"IDATIM", 14}};
+    static const CFieldLayout osde{{"IINFO", 97}, {"ISCSEC", 167}};
+    head.read(fp, m_properties, &m_fieldNames);
     if (version == eOsdeVersion01)
-        CFieldLayout{{"IINFO", 97}, {"ISCSEC", 167}}.read(fp, m_properties, &m_fieldNames);
+        osde.read(fp, m_properties, &m_fieldNames);
     else if (version == eNitfVersion21 || version == eNitfVersion21Variant || version == eNsifVersion10)
         securityLayout21().read(fp, m_properties, &m_fieldNames);
     readBody(fp, {version, false, true, true});
