@@ -36,7 +36,8 @@ void OpenAndReadEverySubheader(benchmark::State& state) {
         reader.open(path.c_str());
         CNitfFileHeader* header = reader.getFileHeader();
         for (int i = 0; i < reader.getImageCount(); ++i) {
-            std::unique_ptr<CNitfImageSubheader> image(header->getNewImageSubheader(reader.getInputStream(), i));
+            std::unique_ptr<CNitfImageSubheader> image(
+                header->getNewImageSubheader(reader.getInputStream(), i));
             benchmark::DoNotOptimize(image.get());
         }
         for (int i = 0; i < reader.getDataExtensionCount(); ++i) {
@@ -44,11 +45,9 @@ void OpenAndReadEverySubheader(benchmark::State& state) {
             benchmark::DoNotOptimize(des.get());
         }
     }
-    state.counters["segments"] = benchmark::Counter(1998.0 * static_cast<double>(state.iterations()),
-                                                    benchmark::Counter::kIsRate);
+    state.counters["segments"] =
+        benchmark::Counter(1998.0 * static_cast<double>(state.iterations()), benchmark::Counter::kIsRate);
 }
 BENCHMARK(OpenAndReadEverySubheader)->Unit(benchmark::kMillisecond);
 
 } // namespace
-
-BENCHMARK_MAIN();

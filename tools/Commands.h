@@ -4,3 +4,4 @@
 int runSelfCheck(int argc, char** argv);
 int runInfo(int argc, char** argv);
 int runSample(int argc, char** argv);
+int runExtract(int argc, char** argv);

@@ -8,10 +8,14 @@
 #include "NitfVersion.h"
 
 static int usage(FILE* out) {
-    std::fprintf(out, "usage: nitf --version\n"
-                      "       nitf info [--json] FILE  describe the file's headers, segments and TREs\n"
-                      "       nitf sample OUT.ntf      write a small demo NITF 2.1 file\n"
-                      "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back\n");
+    std::fprintf(
+        out,
+        "usage: nitf --version\n"
+        "       nitf info [--json] FILE  describe the file's headers, segments and TREs\n"
+        "       nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm -o OUT\n"
+        "                                decode an image (default 0) to canonical raw bytes or a picture\n"
+        "       nitf sample OUT.ntf      write a small demo NITF 2.1 file\n"
+        "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back\n");
     return out == stdout ? 0 : 2;
 }
 
@@ -32,6 +36,8 @@ int main(int argc, char** argv) {
             return runSample(argc - 2, argv + 2);
         if (command == "selfcheck")
             return runSelfCheck(argc - 2, argv + 2);
+        if (command == "extract")
+            return runExtract(argc - 2, argv + 2);
     } catch (const vexo::Exception& e) {
         std::fprintf(stderr, "nitf: %s\n", e.what());
         return 1;

@@ -84,6 +84,8 @@ protected:
     __int64 readSegmentTable(FILE* fp, const char* countName, __int64 firstOffset, int headerLengthWidth,
                              int dataLengthWidth, std::vector<CNitfHeaderDataPair*>* list);
     void recordField(const char* name) { m_fieldNames.push_back(name); }
+    // A new sub-header of type `Subheader` read from image `index`'s place, or null for an unknown index.
+    template <typename Subheader> CNitfImageSubheader* readImageSubheader(FILE* fp, int index);
     void clearContents();
 
     std::vector<CNitfHeaderDataPair*> m_symbols;
@@ -99,7 +101,22 @@ protected:
     std::vector<const char*> m_fieldNames;
 
 private:
+    void seekToImageSubheader(FILE* fp, int index);
     static CNitfHeaderDataPair* pairAt(std::vector<CNitfHeaderDataPair*>& list, int index) {
         return index >= 0 && index < static_cast<int>(list.size()) ? list[index] : nullptr;
     }
 };
+
+template <typename Subheader> CNitfImageSubheader* CNitfFileHeader::readImageSubheader(FILE* fp, int index) {
+    if (!getImageHeaderDataPair(index))
+        return nullptr;
+    seekToImageSubheader(fp, index);
+    Subheader* subheader = new Subheader;
+    try {
+        subheader->read(fp, m_version);
+    } catch (...) {
+        delete subheader;
+        throw;
+    }
+    return subheader;
+}

@@ -13,6 +13,9 @@ class CNitfFile;
 
 class CNitfImageSource {
 public:
+    // The block offset that marks a block absent from the file (block mask entry 0xFFFFFFFF).
+    static constexpr unsigned long long kAbsentBlock = 0xFFFFFFFFULL;
+
     // Takes ownership of the sub-header; the file name is accepted and not used.
     CNitfImageSource(CNitfImageSubheader* subheader, char* fileName);
     CNitfImageSource(const CNitfImageSource&) = delete;
@@ -48,10 +51,12 @@ public:
     // Reads band `band` of block (x, y); a failed or throwing read zero-fills the block and returns false.
     bool readTileNonInterleaved(CNitfFile* file, char* buffer, int band, int x, int y);
 
-    // Reads the block mask record at the stream's position; returns its length in bytes.
+    // Reads the block mask record at the stream's position; returns its length in bytes. Raises
+    // vexo::Exception when the block offsets run past the end of the file or the record is absurdly long.
     int readBlockMask(FILE* fp);
     __int64 computeBlockMaskStorageLength() const;
-    // The file offset of block entry `index` (0xFFFFFFFF: absent), or 0 before the table exists.
+    // The file offset of block entry `index` (0xFFFFFFFF: absent), or 0 before the table exists or for an
+    // index outside it.
     unsigned long long getTileOffset(int index) const;
     bool hasPadPixel() const { return m_hasPadPixel; }
     __int64 getPadPixelValue() const { return m_padPixelValue; }
@@ -85,10 +90,19 @@ public:
 
 protected:
     // Number of entries in the block tables: blocks × bands for IMODE S, blocks for B, P, R, 0 otherwise.
+    // Raises vexo::Exception when the count does not fit in an int.
     int blockEntryCount() const;
+    // Refuses blocking geometry whose sizes the block readers cannot represent (see the definition).
+    void checkGeometry() const;
+    // Bytes the file holds from the image data offset on (0 when the offset lies past its end); set by
+    // readStart.
+    long long availableData() const { return m_availableData; }
+    // Makes an empty tile offset table of blockEntryCount() entries (none for an unknown IMODE).
+    void allocateTileOffsets();
 
     CNitfImagePropertiesIF m_properties;
     unsigned long long* m_tileOffsets;
+    int m_tileOffsetCount;
     unsigned int* m_blockMask;
     int m_blockMaskCount;
     CNitfImageSubheader* m_subheader;
@@ -99,6 +113,7 @@ protected:
     bool m_hasPadPixel;
     long long m_dataOffset;
     long long m_dataLength;
+    long long m_availableData;
     int m_channelType;
     int m_channelIndex;
     int m_imageIndex;

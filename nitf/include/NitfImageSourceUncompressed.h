@@ -29,4 +29,33 @@ public:
 protected:
     void prepareTileOffsets(FILE* fp, long long dataOffset, long long dataLength, unsigned int* blockMask,
                             int count) override;
+
+private:
+    bool isPixelOrRowInterleaved() const;
+    bool isPacked() const { return m_properties.getBpp() % 8 != 0; }
+    bool isValidBlock(int x, int y) const;
+    // Reads `size` stored bytes at `offset` (absent: zeros) into `buffer`: for byte-multiple depths as rows
+    // of `storedRow` bytes placed `rowBytes` apart, for packed depths as one bit stream.
+    bool readStored(FILE* fp, unsigned long long offset, char* buffer, long long size, int storedRow,
+                    int rowBytes);
+    // Makes the block buffer hold block (x, y) of a pixel- or row-interleaved image.
+    bool loadBlockCache(CNitfFile* file, int x, int y);
+    void extractBand(char* buffer, int rowBytes, int band);
+    // A buffer of `size` bytes the image data can justify, or a raised vexo::Exception.
+    char* allocateJustified(long long size, const char* what);
+    // Lays the blocks of a bi-level image out as one image-wide bitmap.
+    char* ReassemblingBitmap(const char* data, long long dataSize, long long dataOffset, int tileWidth,
+                             int tileHeight, int tilesX, int tilesY, long long rowBits, long long rows);
+    void buildBitmap(FILE* fp);
+
+    long long m_tileBandBytes; // one band of one block, as stored
+    long long m_tileBytes;     // one block, every band
+    // IMODE P and R: the last whole block read, for handing out its bands (block m_cacheX, m_cacheY; -1 when
+    // none). IMODE B and S: scratch for interleaving the bands of a block. The work buffer of the base holds
+    // the image-wide bitmap of a bi-level image.
+    char* m_blockBuffer;
+    int m_cacheX;
+    int m_cacheY;
+    long long m_bitmapRowBits;
+    long long m_bitmapRows;
 };

@@ -98,3 +98,7 @@ void CNitfFileHeader::readTagArea(FILE* fp, const char* lengthName) {
     DKFSeek64(fp, 3, SEEK_CUR);
     CNitfTag::readArea(fp, length - 3, CNitfTag::eTagSourceFileHeader, m_taggedRecords, true);
 }
+
+void CNitfFileHeader::seekToImageSubheader(FILE* fp, int index) {
+    DKFSeek64(fp, getImageHeaderDataPair(index)->getHeaderOffset(), SEEK_SET);
+}

@@ -65,16 +65,5 @@ void CNitfFileHeaderV20::getTitle(char* title) {
 }
 
 CNitfImageSubheader* CNitfFileHeaderV20::getNewImageSubheader(FILE* fp, int index) {
-    CNitfHeaderDataPair* pair = getImageHeaderDataPair(index);
-    if (!pair)
-        return nullptr;
-    DKFSeek64(fp, pair->getHeaderOffset(), SEEK_SET);
-    CNitfImageSubheaderV20* subheader = new CNitfImageSubheaderV20;
-    try {
-        subheader->read(fp, m_version);
-    } catch (...) {
-        delete subheader;
-        throw;
-    }
-    return subheader;
+    return readImageSubheader<CNitfImageSubheaderV20>(fp, index);
 }

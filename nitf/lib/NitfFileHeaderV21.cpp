@@ -169,16 +169,5 @@ void CNitfFileHeaderV21::getTitle(char* title) {
 }
 
 CNitfImageSubheader* CNitfFileHeaderV21::getNewImageSubheader(FILE* fp, int index) {
-    CNitfHeaderDataPair* pair = getImageHeaderDataPair(index);
-    if (!pair)
-        return nullptr;
-    DKFSeek64(fp, pair->getHeaderOffset(), SEEK_SET);
-    CNitfImageSubheaderV21* subheader = new CNitfImageSubheaderV21;
-    try {
-        subheader->read(fp, m_version);
-    } catch (...) {
-        delete subheader;
-        throw;
-    }
-    return subheader;
+    return readImageSubheader<CNitfImageSubheaderV21>(fp, index);
 }

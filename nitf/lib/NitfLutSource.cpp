@@ -53,31 +53,28 @@ static void readStored(CNitfFile* file, __int64 offset, char* buffer, int size) 
         std::memset(buffer + got, 0, size - got);
 }
 
-void CNitfLutSource::readInterleaved(CNitfFile* file, char* buffer, int) {
-    int size = getSize();
+// The stored table, or (convert) its entries gathered from the component tables into entry order.
+static void readTable(CNitfFile* file, const CNitfLutSource& lut, char* buffer, bool convert) {
+    int size = lut.getSize();
     if (size <= 0)
         return;
-    if (m_interleaved) {
-        readStored(file, m_entryOffset, buffer, size);
+    if (!convert) {
+        readStored(file, lut.getEntryOffset(), buffer, size);
         return;
     }
     std::vector<char> stored(size);
-    readStored(file, m_entryOffset, stored.data(), size);
-    interleave(buffer, stored.data(), m_entryCount, getEntrySize(), m_entryCount);
+    readStored(file, lut.getEntryOffset(), stored.data(), size);
+    CNitfLutSource::interleave(buffer, stored.data(), lut.getEntryCount(), lut.getEntrySize(),
+                               lut.getEntryCount());
 }
 
+void CNitfLutSource::readInterleaved(CNitfFile* file, char* buffer, int) {
+    readTable(file, *this, buffer, !m_interleaved);
+}
+
+// With the interleaved flag set the caller's buffer is in entry order, so the stored tables are converted.
 void CNitfLutSource::readNonInterleaved(CNitfFile* file, char* buffer, int) {
-    int size = getSize();
-    if (size <= 0)
-        return;
-    if (!m_interleaved) {
-        readStored(file, m_entryOffset, buffer, size);
-        return;
-    }
-    // The caller wants its buffer in entry order: convert from the stored component tables.
-    std::vector<char> stored(size);
-    readStored(file, m_entryOffset, stored.data(), size);
-    interleave(buffer, stored.data(), m_entryCount, getEntrySize(), m_entryCount);
+    readTable(file, *this, buffer, m_interleaved);
 }
 
 void CNitfLutSource::writeNonInterleaved(CNitfFile* file, char* buffer, int) {

@@ -1,0 +1,167 @@
+// Damaged image geometry and block tables: refused with vexo::Exception, or read with zeros, never a crash or
+// an allocation the file cannot justify.
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "HostError.h"
+#include "NitfFileReader.h"
+#include "NitfImageSource.h"
+#include "NitfLutSource.h"
+#include "NitfSampleWriter.h"
+#include "TestFiles.h"
+
+namespace {
+
+using nitfsample::Image;
+
+std::string fileWith(const Image& image) {
+    nitfsample::File file;
+    file.images = {image};
+    return nitfsample::build(file);
+}
+
+// Opens image 0 and reads every block of every band and its LUTs into buffers sized by the properties.
+// Returns the exception's message, or "" when everything was read.
+std::string readEverything(const std::string& bytes) {
+    TempFile file(bytes);
+    CNitfFileReader reader;
+    if (!reader.open(file.path().c_str()))
+        return "cannot open";
+    try {
+        std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(0));
+        CNitfImagePropertiesIF& p = source->getImageProperties();
+        std::vector<char> block(static_cast<size_t>(std::max<long long>(
+            p.getTileBandBufferSize(), 1LL * p.getTileHeight() * p.getTileBandWidthBufferSize())));
+        for (int band = 0; band < p.getBandCount(); ++band)
+            for (int y = 0; y < p.getTileCountY(); ++y)
+                for (int x = 0; x < p.getTileCountX(); ++x)
+                    source->readTileNonInterleaved(&reader, block.data(), band, x, y);
+        for (int i = 0; i < source->getLutCount(); ++i) {
+            CNitfLutSource* lut = source->getLutSource(i);
+            std::vector<char> entries(static_cast<size_t>(lut->getSize()) + 1);
+            lut->readInterleaved(&reader, entries.data(), lut->getSize());
+        }
+    } catch (const vexo::Exception& e) {
+        return e.what();
+    }
+    return "";
+}
+
+Image smallImage() {
+    Image image;
+    image.cols = image.rows = 16;
+    image.nppbh = image.nppbv = 8;
+    return image;
+}
+
+} // namespace
+
+TEST(ImageMalformed, GeometryBeyondTheFileIsRefused) {
+    using nitfsample::Overrides;
+    struct Case {
+        const char* what;
+        Overrides fields;
+        int bands;
+        char imode;
+        const char* message;
+    };
+    const Case cases[] = {
+        {"blocks the data cannot hold", {{"NBPR", "9999"}, {"NBPC", "9999"}}, 1, 'B', "cannot hold"},
+        {"band-sequential blocks beyond an int",
+         {{"NBPR", "9999"}, {"NBPC", "9999"}},
+         22,
+         'S',
+         "too many blocks"},
+        {"a block beyond an int",
+         {{"NCOLS", "99999999"},
+          {"NROWS", "99999999"},
+          {"NPPBH", "0000"},
+          {"NPPBV", "0000"},
+          {"NBPR", "0001"},
+          {"NBPC", "0001"}},
+         1,
+         'B',
+         "too large"},
+        {"block rows beyond an int",
+         {{"NCOLS", "99999999"},
+          {"NPPBH", "0000"},
+          {"NPPBV", "0001"},
+          {"NBPP", "64"},
+          {"NBPR", "0001"},
+          {"NBPC", "0016"}},
+         9,
+         'B',
+         "too long"},
+        {"a pixel-interleaved block far larger than the file",
+         {{"NPPBH", "9999"}, {"NPPBV", "9999"}, {"NBPR", "0001"}, {"NBPC", "0001"}},
+         3,
+         'P',
+         "larger than the image data"},
+        {"a bi-level bitmap far larger than the file",
+         {{"NPPBH", "9999"},
+          {"NPPBV", "9999"},
+          {"NBPR", "0009"},
+          {"NBPC", "0009"},
+          {"NBPP", "01"},
+          {"PVTYPE", "B"}},
+         1,
+         'B',
+         "larger than the image data"},
+        {"an unknown interleaving", {{"IMODE", "X"}}, 3, 'B', "Unknown interleaving mode"},
+        {"no blocks", {{"NBPR", "0000"}}, 1, 'B', "Invalid image geometry"},
+        {"a negative block size", {{"NPPBV", "-001"}}, 1, 'B', "Invalid image geometry"},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.what);
+        Image image = smallImage();
+        image.bands = c.bands;
+        image.imode = c.imode;
+        image.fields = c.fields;
+        const std::string message = readEverything(fileWith(image));
+        EXPECT_NE(message.find(c.message), std::string::npos) << message;
+    }
+}
+
+TEST(ImageMalformed, DataThatTheFileDoesNotHoldReadsAsZeros) {
+    // A block-interleaved image cut off in the second band of its second block: what is missing reads as
+    // zeros, never as stale bytes.
+    Image image = smallImage();
+    image.bands = 2;
+    std::string bytes = fileWith(image);
+    TempFile file(bytes.substr(0, bytes.size() - 2 * 128 - 10));
+    CNitfFileReader reader;
+    ASSERT_TRUE(reader.open(file.path().c_str()));
+    std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(0));
+    std::vector<char> block(64, 'x');
+    ASSERT_TRUE(source->readTileNonInterleaved(&reader, block.data(), 1, 1, 0));
+    EXPECT_EQ(static_cast<unsigned char>(block[0]), nitfsample::sampleAt(image, 1, 0, 8));
+    EXPECT_EQ(static_cast<unsigned char>(block[53]), nitfsample::sampleAt(image, 1, 6, 13));
+    EXPECT_EQ(block[54], 0);
+    EXPECT_EQ(block[63], 0);
+    ASSERT_TRUE(source->readTileNonInterleaved(&reader, block.data(), 1, 1, 1));
+    EXPECT_EQ(block, std::vector<char>(64, 0));
+
+    // Block offsets pointing past the end of the file, and a table of them that is itself cut short.
+    Image masked = smallImage();
+    masked.ic = "NM";
+    bytes = fileWith(masked);
+    TempFile first(bytes);
+    CNitfFileReader probe;
+    ASSERT_TRUE(probe.open(first.path().c_str()));
+    const size_t mask =
+        static_cast<size_t>(probe.getFileHeader()->getImageHeaderDataPair(0)->getDataOffset()) + 10;
+    bytes.replace(mask + 4, 4, std::string("\x7F\xFF\xFF\x00", 4));
+    EXPECT_EQ(readEverything(bytes), "");
+    EXPECT_NE(readEverything(bytes.substr(0, mask + 6)).find("block mask"), std::string::npos);
+
+    // Look-up tables longer than the rest of the file: the fields after them read as blanks past the end, so
+    // the image has no interleaving to read it by.
+    Image lut = smallImage();
+    lut.irep = "RGB/LUT";
+    lut.bandInfo = {{"LU", "", {"abcd", "efgh", "ijkl"}}};
+    lut.fields = {{"NELUT1", "99999"}};
+    EXPECT_NE(readEverything(fileWith(lut)).find("Unknown interleaving mode"), std::string::npos);
+}
