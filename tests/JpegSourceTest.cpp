@@ -9,6 +9,7 @@
 
 #include "BlockResampler.h"
 #include "HostError.h"
+#include "ImageExtract.h"
 #include "JpegAmplitudeMap.h"
 #include "JpegStreamDecoder.h"
 #include "JpegStreams.h"
@@ -252,6 +253,36 @@ TEST(JpegSource, LosslessRoundTripsAreExactMaskedOrNot) {
         EXPECT_TRUE(masked.source().readTileNonInterleaved(masked.file(), buffer.data(), 0, 0, 1));
         EXPECT_EQ(JpegFile::samples(buffer, precision == 8 ? 1 : 2), cut(blocks[2]));
     }
+}
+
+TEST(JpegSource, ExtractWritesTwelveBitSamplesCanonically) {
+    // Two 24 x 20 blocks holding a 40 x 20 image: the right block is cropped.
+    const Raster whole = jpegtest::pattern(48, 20, 1, 12, 31);
+    std::vector<std::string> streams;
+    for (int b = 0; b < 2; ++b) {
+        Raster half{24, 20, 1, {}};
+        for (int y = 0; y < 20; ++y)
+            for (int x = 0; x < 24; ++x)
+                half.samples.push_back(whole.at(24 * b + x, y));
+        streams.push_back(jpegtest::encode(half, lossless(12)));
+    }
+    nitfsample::Image image = jpegImage("C5", 0, 0, 1, 12, 'B', streams);
+    image.cols = 40;
+    image.rows = 20;
+    image.nppbh = 24;
+    image.nppbv = 20;
+    JpegFile file(image);
+    nitfextract::BandReader reader(*file.file(), file.source());
+    std::string canonical;
+    nitfextract::writeCanonical(reader, 0, [&](const unsigned char* data, size_t size) {
+        canonical.append(reinterpret_cast<const char*>(data), size);
+    });
+    Raster cropped{40, 20, 1, {}};
+    for (int y = 0; y < 20; ++y)
+        for (int x = 0; x < 40; ++x)
+            cropped.samples.push_back(whole.at(x, y));
+    EXPECT_EQ(canonical, jpegtest::canonical(cropped, 0, 12));
+    EXPECT_EQ(reader.failedBlocks(), 0);
 }
 
 TEST(JpegSource, TwelveBitDctMatchesLibjpeg) {

@@ -133,7 +133,7 @@ const unsigned short* CJpegStreamDecoder::defaultQuantTable(int quality) {
 
 void CJpegStreamDecoder::readHeader(FILE* fp, unsigned long long offset, unsigned long long length) {
     static const char signature[] =
-        "void __cdecl CJpegStreamDecoder::readHeader(struct _iobuf *,unsigned __int64,unsigned __int64)";
+        "void __cdecl CJpegStreamDecoder::readHeader(" NITF_FILE_SIG ",unsigned __int64,unsigned __int64)";
     jpeg_abort_decompress(&m_cinfo);
     m_sawAmplitudeMarker = false;
     m_source.fp = fp;

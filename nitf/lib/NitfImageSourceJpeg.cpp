@@ -18,13 +18,12 @@ static const char kSourceFile[] = "nitf/lib/NitfImageSourceJpeg";
 
 namespace {
 
-const unsigned long long kAbsent = 0xFFFFFFFFULL;
 const size_t kScanChunk = 65536;
 // A stream may be coded smaller or larger than its block; one this much larger than the block is damage.
 const long long kLargestStreamToBlock = 16;
 
 const char kDecodeSignature[] =
-    "bool __cdecl CNitfImageSourceJpeg::decodeBlock(struct _iobuf *,int,unsigned char *,int,int,bool)";
+    "bool __cdecl CNitfImageSourceJpeg::decodeBlock(" NITF_FILE_SIG ",int,unsigned char *,int,int,bool)";
 
 bool startsWithNoCase(const std::string& text, const char* prefix) {
     return strncasecmp(text.c_str(), prefix, std::strlen(prefix)) == 0;
@@ -110,14 +109,14 @@ std::vector<unsigned long long> CNitfImageSourceJpeg::findStreamStarts(FILE* fp,
 
 void CNitfImageSourceJpeg::prepareTileOffsets(FILE* fp, long long dataOffset, long long dataLength,
                                               unsigned int* blockMask, int count) {
-    const int entries = blockEntryCount();
+    const int entries = m_tileOffsetCount;
     if (!m_tileOffsets || entries == 0)
         return;
     if (blockMask) {
         for (int i = 0; i < entries; ++i) {
-            const unsigned long long entry = i < count ? blockMask[i] : kAbsent;
+            const unsigned long long entry = i < count ? blockMask[i] : kAbsentBlock;
             m_tileOffsets[i] =
-                entry == kAbsent ? kAbsent : entry + static_cast<unsigned long long>(dataOffset);
+                entry == kAbsentBlock ? kAbsentBlock : entry + static_cast<unsigned long long>(dataOffset);
         }
         return;
     }
@@ -126,7 +125,7 @@ void CNitfImageSourceJpeg::prepareTileOffsets(FILE* fp, long long dataOffset, lo
     const std::vector<unsigned long long> starts =
         findStreamStarts(fp, dataOffset, dataLength, static_cast<size_t>(entries));
     for (int i = 0; i < entries; ++i)
-        m_tileOffsets[i] = static_cast<size_t>(i) < starts.size() ? starts[i] : kAbsent;
+        m_tileOffsets[i] = static_cast<size_t>(i) < starts.size() ? starts[i] : kAbsentBlock;
 }
 
 unsigned long long CNitfImageSourceJpeg::streamLength(unsigned long long offset) const {
@@ -139,14 +138,15 @@ unsigned long long CNitfImageSourceJpeg::streamLength(unsigned long long offset)
 // ------------------------------------------------------------------------------------------------
 
 void CNitfImageSourceJpeg::readStart(FILE* fp, long long dataOffset, long long dataLength) {
+    checkGeometry();
     CNitfImageSource::readStart(fp, dataOffset, dataLength);
     m_dataEnd = static_cast<unsigned long long>(dataOffset) +
                 static_cast<unsigned long long>(std::max(dataLength, 0LL));
     prepareTileOffsets(fp, dataOffset, dataLength, m_blockMask, m_blockMaskCount);
 
     m_sortedOffsets.clear();
-    for (int i = 0, n = blockEntryCount(); m_tileOffsets && i < n; ++i)
-        if (m_tileOffsets[i] != kAbsent)
+    for (int i = 0; m_tileOffsets && i < m_tileOffsetCount; ++i)
+        if (m_tileOffsets[i] != kAbsentBlock)
             m_sortedOffsets.push_back(m_tileOffsets[i]);
     std::sort(m_sortedOffsets.begin(), m_sortedOffsets.end());
     m_sortedOffsets.erase(std::unique(m_sortedOffsets.begin(), m_sortedOffsets.end()), m_sortedOffsets.end());
@@ -265,8 +265,10 @@ bool CNitfImageSourceJpeg::readTileNonInterleaved(CNitfFile* file, char* buffer,
 
 bool CNitfImageSourceJpeg::decodeBlock(FILE* fp, int index, unsigned char* buffer, int rowBytes,
                                        int components, bool interleaved) {
+    if (index < 0 || index >= m_tileOffsetCount)
+        return false;
     const unsigned long long offset = m_tileOffsets[index];
-    if (offset == kAbsent)
+    if (offset == kAbsentBlock)
         return false;
     m_decoder->readHeader(fp, offset, streamLength(offset));
     ++m_decodeCount;
