@@ -87,6 +87,8 @@ std::string encode(const Raster& raster, const Coding& coding) {
             jpeg_enable_lossless(&cinfo, coding.predictor, 0);
         } else {
             jpeg_set_quality(&cinfo, coding.quality, FALSE);
+            if (coding.progressive)
+                jpeg_simple_progression(&cinfo);
             if (coding.quantTable) {
                 jpeg_add_quant_table(&cinfo, 0, coding.quantTable, 100, FALSE);
                 for (int c = 0; c < cinfo.num_components; ++c)

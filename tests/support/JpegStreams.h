@@ -30,6 +30,7 @@ struct Coding {
     int predictor = 0;                    // 1 to 7: the lossless process
     bool rgb = false;                     // three components coded as R, G, B (no colour transform)
     int restartRows = 0;                  // a restart marker every this many MCU rows (0: none)
+    bool progressive = false;             // DCT only: libjpeg's standard progressive scan script
     const unsigned* quantTable = nullptr; // 64 values in natural order for table 0 (all components)
     std::vector<std::string> app6;        // APP6 payloads, written right after SOI
     std::vector<std::string> comments;    // COM payloads, written after the APP6 markers
