@@ -322,7 +322,7 @@ void CNitfImageSourceJpeg::setColourSpaces(bool interleaved) {
 void CNitfImageSourceJpeg::checkStream(int rowBytes, int components) const {
     const int precision = m_decoder->precision();
     const int bpp = m_properties.getBpp();
-    if (precision > bpp || m_decoder->sampleBytes() != sampleBytes())
+    if (precision > bpp || bpp > 16 || m_decoder->sampleBytes() != sampleBytes())
         NITF_RAISE_FORMAT(kDecodeSignature,
                           "A JPEG stream of %d-bit precision does not fit an image of %d bits", precision,
                           bpp);
