@@ -15,7 +15,7 @@ public:
         eCompressionAridPcm = 4,         // C2, M2
         eCompressionJpeg = 5,            // C3, M3 (12-bit samples are delivered in two bytes)
         eCompressionVQ = 6,              // C4, M4
-        eCompressionJpegLossless = 7,    // C5, M5
+        eCompressionJpegLossless = 7,    // C5, M5 (12-bit samples also in two bytes)
         eCompressionDownsampledJpeg = 8, // I1
         eCompressionJpeg2000 = 9,        // C8, M8
         eCompressionCorrelated = 10,     // C6, M6

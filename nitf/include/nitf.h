@@ -49,6 +49,7 @@
 #include "NitfHeaderDataPair.h"
 #include "NitfImagePropertiesIF.h"
 #include "NitfImageSource.h"
+#include "NitfImageSourceJpeg.h"
 #include "NitfImageSourceUncompressed.h"
 #include "NitfImageSubheader.h"
 #include "NitfImageSubheaderV10.h"

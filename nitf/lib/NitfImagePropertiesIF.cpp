@@ -103,8 +103,9 @@ __int64 CNitfImagePropertiesIF::getImageBufferSize() const {
 }
 
 int CNitfImagePropertiesIF::getTileBandWidthBufferSize() const {
-    // 12-bit JPEG samples are delivered in two bytes each.
-    if (m_bpp == 12 && m_compressionType == eCompressionJpeg)
+    // 12-bit JPEG samples (DCT or lossless) are delivered in two bytes each.
+    if (m_bpp == 12 &&
+        (m_compressionType == eCompressionJpeg || m_compressionType == eCompressionJpegLossless))
         return m_tileWidth * 2;
     return static_cast<int>(static_cast<long long>(m_tileWidth) * m_bpp / 8);
 }

@@ -51,6 +51,7 @@ BandReader::BandReader(CNitfFile& file, CNitfImageSource& source) : m_file(file)
         throw std::runtime_error("the image's blocks do not cover its " + std::to_string(m_cols) + " x " +
                                  std::to_string(m_rows) + " pixels");
     m_rowStride = p.getTileBandWidthBufferSize();
+    m_nativeWords = m_bits % 8 != 0 && m_bits <= 16 && m_rowStride == 2 * m_blockWidth;
     // The reader fills whole rows of the stride, and packed depths fill the band's whole bit stream.
     const long long rowsSize = static_cast<long long>(m_rowStride) * m_blockHeight;
     const long long size = std::max(rowsSize, static_cast<long long>(p.getTileBandBufferSize()));
@@ -89,6 +90,15 @@ void BandReader::copyBlock(const unsigned char* block, int blockX, int rows, uns
             // Whole-byte samples arrive big-endian, as stored: the canonical form already.
             std::memcpy(out, block + static_cast<size_t>(r) * m_rowStride,
                         static_cast<size_t>(cols) * m_sampleBytes);
+            continue;
+        }
+        if (m_nativeWords) {
+            for (int c = 0; c < cols; ++c) {
+                uint16_t value;
+                std::memcpy(&value, block + static_cast<size_t>(r) * m_rowStride + 2 * c, 2);
+                out[2 * c] = static_cast<unsigned char>(value >> 8);
+                out[2 * c + 1] = static_cast<unsigned char>(value & 0xFF);
+            }
             continue;
         }
         // Packed depths arrive as the band's bit stream, rows running on without padding.

@@ -49,6 +49,8 @@ private:
     bool m_signed;
     int m_blockWidth, m_blockHeight, m_blocksX, m_strips;
     int m_rowStride; // bytes between the rows of a block band (byte-multiple depths)
+    // 12-bit JPEG: the library delivers each sample whole in two bytes of native order, not packed.
+    bool m_nativeWords;
     std::vector<unsigned char> m_block;
     int m_failedBlocks = 0;
 };

@@ -1,0 +1,87 @@
+// Image segments compressed with JPEG: DCT ("C3", "M3", 8- and 12-bit), lossless ("C5", "M5") and downsampled
+// ("I1"). Every block (every block and band for IMODE "S") is one complete JPEG stream; streams are found
+// through the block mask or by scanning for their start markers, and decoded with libjpeg straight into the
+// caller's buffer. Streams without tables get the NITF defaults chosen by COMRAT; streams of another size
+// than their block are fitted to it; 12-bit data are mapped by an IOMAPA extension when the stream asks for
+// it.
+//
+// Samples are delivered as 1 byte (up to 8 bits) or 2 bytes in native order (12 and 16 bits). A buffer for a
+// block holds tile-height rows of the row size given; three-band YCbCr streams are delivered as RGB.
+#pragma once
+
+#include <memory>
+#include <vector>
+
+#include "NitfImageSource.h"
+
+class CJpegStreamDecoder;
+class CJpegAmplitudeMap;
+
+class CNitfImageSourceJpeg : public CNitfImageSource {
+public:
+    CNitfImageSourceJpeg(CNitfImageSubheader* subheader, char* fileName);
+    ~CNitfImageSourceJpeg() override;
+
+    using CNitfImageSource::readTileInterleaved;
+    using CNitfImageSource::readTileNonInterleaved;
+
+    // Locates the blocks' streams and prepares the decoder.
+    void readStart(FILE* fp, long long dataOffset, long long dataLength) override;
+    // All bands of block (x, y), pixel-interleaved; false when the block is absent. Raises vexo::Exception
+    // for a damaged stream.
+    bool readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y) override;
+    // Band `band` of block (x, y); false when the block is absent. Raises vexo::Exception for a damaged
+    // stream.
+    bool readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y, int band) override;
+
+    // The file positions of the first `limit` start-of-image markers in `length` bytes from `offset`, in
+    // order. Comment segments are skipped (also when they straddle a read chunk), so a marker pattern inside
+    // one does not count; entropy-coded data cannot hold the pattern.
+    static std::vector<unsigned long long> findStreamStarts(FILE* fp, long long offset, long long length,
+                                                            size_t limit);
+
+    // How many JPEG streams this source has decoded.
+    long long getDecodeCount() const { return m_decodeCount; }
+    // Whether a stream carried the "NITF0001.A" marker (12-bit amplitude mapping), and its offset.
+    bool hasNitfApp6() const { return m_hasNitfApp6; }
+    unsigned short getAmplitudeOffset() const { return m_amplitudeOffset; }
+
+protected:
+    void prepareTileOffsets(FILE* fp, long long dataOffset, long long dataLength, unsigned int* blockMask,
+                            int count) override;
+
+private:
+    // How IREP sets libjpeg's colour spaces.
+    enum eColour_t { eColourAsStored, eColourRgb, eColourMulti, eColourYCbCr };
+
+    bool isBandSequential() const;
+    int sampleBytes() const;
+    bool isValidBlock(int x, int y, int band) const;
+    // Decodes the stream of block entry `index` into `buffer` as `components` samples per pixel, fitted to
+    // the block size; false when the block is absent.
+    bool decodeBlock(FILE* fp, int index, unsigned char* buffer, int rowBytes, int components,
+                     bool interleaved);
+    void checkStream(int rowBytes, int components) const;
+    void setColourSpaces(bool interleaved);
+    void readRowsResampled(unsigned char* buffer, int rowBytes, int components);
+    // The bytes from `offset` to the next block's stream or the end of the image data.
+    unsigned long long streamLength(unsigned long long offset) const;
+    void applyAmplitudeMapping(unsigned char* buffer, int rowBytes, CNitfFile* file);
+
+    std::unique_ptr<CJpegStreamDecoder> m_decoder;
+    std::unique_ptr<CJpegAmplitudeMap> m_amplitudeMap;
+    std::vector<unsigned long long> m_sortedOffsets;
+    std::vector<unsigned char> m_bandSequentialBuffer;
+    std::vector<unsigned char> m_cachedBlockBuffer;
+    std::vector<unsigned char> m_rowBuffer;
+    std::vector<unsigned char*> m_rowPointers;
+    int m_cachedX;
+    int m_cachedY;
+    unsigned long long m_dataEnd;
+    eColour_t m_colour;
+    unsigned short m_amplitudeOffset;
+    unsigned short m_mappedOffset; // the amplitude offset m_amplitudeMap was built with
+    bool m_hasNitfApp6;
+    bool m_method3Warned;
+    long long m_decodeCount;
+};
