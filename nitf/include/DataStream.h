@@ -16,8 +16,14 @@ public:
     // Reverses a 2-, 4- or 8-byte value in place (other sizes are left alone).
     static void reverse(void* value, int size);
 
-    // Bytes between the stream's position and the end of the file (0 when it cannot be told).
+    // Bytes between the stream's position and the end of the file (0 when it cannot be told). Streams the
+    // host cannot size (memory streams) are measured by seeking to their end and back.
     static __int64 remaining(FILE* fp);
+
+    // Reads `length` bytes at the stream's position (at `offset`); what the file does not hold reads as
+    // zeros, never as stale bytes. Returns the bytes actually read.
+    static size_t readZeroFilled(FILE* fp, void* buffer, size_t length);
+    static size_t readZeroFilledAt(FILE* fp, __int64 offset, void* buffer, size_t length);
 
     // Raises vexo::Exception when `length` bytes cannot be read at the stream's position: the guard in front
     // of every allocation whose size comes from the file.

@@ -1,6 +1,7 @@
 #include "DataStream.h"
 
 #include <algorithm>
+#include <cstring>
 #include <utility>
 
 #include "HostFile.h"
@@ -16,11 +17,32 @@ void CDataStream::reverse(void* value, int size) {
 }
 
 __int64 CDataStream::remaining(FILE* fp) {
-    __int64 size = DKSize(fp);
     __int64 position = DKFTell(fp);
-    if (size < 0 || position < 0 || position > size)
+    if (position < 0)
         return 0;
-    return size - position;
+    __int64 size = DKSize(fp);
+    if (size < 0) {
+        if (DKFSeek64(fp, 0, SEEK_END) != 0)
+            return 0;
+        size = DKFTell(fp);
+        DKFSeek64(fp, position, SEEK_SET);
+    }
+    return size > position ? size - position : 0;
+}
+
+size_t CDataStream::readZeroFilled(FILE* fp, void* buffer, size_t length) {
+    size_t got = length > 0 ? DKFRead(buffer, 1, length, fp) : 0;
+    if (got < length)
+        std::memset(static_cast<char*>(buffer) + got, 0, length - got);
+    return got;
+}
+
+size_t CDataStream::readZeroFilledAt(FILE* fp, __int64 offset, void* buffer, size_t length) {
+    if (offset < 0 || DKFSeek64(fp, offset, SEEK_SET) != 0) {
+        std::memset(buffer, 0, length);
+        return 0;
+    }
+    return readZeroFilled(fp, buffer, length);
 }
 
 void CDataStream::requireReadable(FILE* fp, __int64 length, const char* what) {

@@ -11,9 +11,7 @@
 static const int kSmallField = 1 << 16;
 
 void CDataStreamRead::readRaw(void* buffer, size_t length) {
-    size_t got = DKFRead(buffer, 1, length, m_fp);
-    if (got < length)
-        std::memset(static_cast<char*>(buffer) + got, 0, length - got);
+    readZeroFilled(m_fp, buffer, length);
 }
 
 unsigned char CDataStreamRead::readByte() {

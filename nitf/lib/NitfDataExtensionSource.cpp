@@ -125,8 +125,7 @@ void CNitfDataExtensionSource::readStreamingHeader(FILE* fp) {
     CDataStream::requireReadable(fp, length, "A streaming file header");
     m_streamingHeaderLength = length;
     m_streamingHeader = static_cast<char*>(HMalloc(length > 0 ? length : 1));
-    size_t got = DKFRead(m_streamingHeader, 1, length, fp);
-    std::memset(m_streamingHeader + got, 0, length - got);
+    CDataStream::readZeroFilled(fp, m_streamingHeader, static_cast<size_t>(length));
     trail.read(fp, m_properties, &m_fieldNames);
     // Leave the stream at the first byte of the replacement header.
     DKFSeek64(fp, -(11 + static_cast<__int64>(length)), SEEK_CUR);

@@ -264,8 +264,7 @@ int CNitfImageSource::readBlockMask(FILE* fp) {
         CDataStream::requireReadable(fp, 4 * count, "The block mask");
         m_blockMask = static_cast<unsigned int*>(HMalloc(static_cast<size_t>(4 * count)));
         m_blockMaskCount = static_cast<int>(count);
-        size_t got = DKFRead(m_blockMask, 4, static_cast<size_t>(count), fp);
-        std::memset(m_blockMask + got, 0, static_cast<size_t>(count - static_cast<long long>(got)) * 4);
+        CDataStream::readZeroFilled(fp, m_blockMask, static_cast<size_t>(4 * count));
         for (long long i = 0; i < count; ++i)
             CDataStream::reverse(&m_blockMask[i], 4);
     }

@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <cstring>
 
+#include "DataStream.h"
 #include "HostFile.h"
 #include "HostMemory.h"
 #include "NitfFile.h"
@@ -21,12 +22,9 @@ const long long kAllocationSlack = 1 << 20;
 
 // Reads `size` bytes at `offset`; whatever the file does not hold reads as zeros.
 void readAt(FILE* fp, unsigned long long offset, char* buffer, size_t size) {
-    size_t got = 0;
-    if (offset <= static_cast<unsigned long long>(LLONG_MAX) &&
-        DKFSeek64(fp, static_cast<__int64>(offset), SEEK_SET) == 0)
-        got = DKFRead(buffer, 1, size, fp);
-    if (got < size)
-        std::memset(buffer + got, 0, size - got);
+    __int64 position =
+        offset <= static_cast<unsigned long long>(LLONG_MAX) ? static_cast<__int64>(offset) : -1;
+    CDataStream::readZeroFilledAt(fp, position, buffer, size);
 }
 
 // ---- bit streams, most significant bit first --------------------------------------------------------------
@@ -324,9 +322,10 @@ bool CNitfImageSourceUncompressed::readStored(FILE* fp, unsigned long long offse
     const bool seeked = DKFSeek64(fp, static_cast<__int64>(offset), SEEK_SET) == 0;
     for (size_t r = 0; r < rows; ++r) {
         char* out = buffer + r * rowBytes;
-        const size_t got = seeked ? DKFRead(out, 1, row, fp) : 0;
-        if (got < row)
-            std::memset(out + got, 0, row - got);
+        if (seeked)
+            CDataStream::readZeroFilled(fp, out, row);
+        else
+            std::memset(out, 0, row);
     }
     return true;
 }

@@ -3,6 +3,7 @@
 #include <cstring>
 #include <vector>
 
+#include "DataStream.h"
 #include "HostFile.h"
 #include "NitfFile.h"
 
@@ -44,13 +45,8 @@ void CNitfLutSource::interleave(char* dst, char* src, int entries, int component
     }
 }
 
-// Reads the stored table; bytes past the end of the file read as zeros.
 static void readStored(CNitfFile* file, __int64 offset, char* buffer, int size) {
-    FILE* fp = file->getInputStream();
-    DKFSeek64(fp, offset, SEEK_SET);
-    size_t got = size > 0 ? DKFRead(buffer, 1, size, fp) : 0;
-    if (static_cast<int>(got) < size)
-        std::memset(buffer + got, 0, size - got);
+    CDataStream::readZeroFilledAt(file->getInputStream(), offset, buffer, static_cast<size_t>(size));
 }
 
 // The stored table, or (convert) its entries gathered from the component tables into entry order.

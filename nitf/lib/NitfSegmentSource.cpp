@@ -61,7 +61,7 @@ char* CNitfSegmentSource::getNewData(CNitfFile* file) {
     __int64 length = m_dataLength > 0 ? m_dataLength : 0;
     CDataStream::requireReadable(fp, length, "Segment data");
     char* data = static_cast<char*>(HMalloc(static_cast<size_t>(length) + 1));
-    size_t got = DKFRead(data, 1, static_cast<size_t>(length), fp);
-    std::memset(data + got, 0, static_cast<size_t>(length) - got + 1);
+    CDataStream::readZeroFilled(fp, data, static_cast<size_t>(length));
+    data[length] = '\0';
     return data;
 }

@@ -4,6 +4,8 @@
 #include <cstring>
 #include <string>
 
+#include "DataStream.h"
+
 #include "HostFile.h"
 #include "Raise.h"
 
@@ -138,17 +140,7 @@ char* KeyStore::add(const char* key, size_t length) {
 }
 
 __int64 bytesLeft(FILE* fp) {
-    __int64 here = DKFTell(fp);
-    if (here < 0)
-        return 0;
-    __int64 end = DKSize(fp);
-    if (end < 0) {
-        if (DKFSeek64(fp, 0, SEEK_END) != 0)
-            return 0;
-        end = DKFTell(fp);
-        DKFSeek64(fp, here, SEEK_SET);
-    }
-    return end > here ? end - here : 0;
+    return CDataStream::remaining(fp);
 }
 
 // ---- field values
