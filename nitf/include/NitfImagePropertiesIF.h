@@ -69,10 +69,25 @@ public:
     int getImageWidthBufferSize() const;
     __int64 getImageBandBufferSize() const;
     __int64 getImageBufferSize() const;
+    // The row sizes of block buffers. Sources that deliver whole samples (every compression but uncompressed
+    // and bi-level) use getSampleContainerBytes() per sample; the others use NBPP bits, truncated to bytes.
     int getTileBandWidthBufferSize() const;
     int getTileWidthBufferSize() const;
+    // The stored size of one band of a block, and of a whole block (NBPP bits per sample, rounded up).
     __int64 getTileBandBufferSize() const;
     __int64 getTileBufferSize() const;
+
+    // The bytes a caller's buffer needs for one band of one block (readTileNonInterleaved), and for a whole
+    // block of every band (readTileInterleaved): the stored size or tile-height rows of the row size,
+    // whichever is larger. Size block buffers with these.
+    __int64 getTileBandReadBufferSize() const;
+    __int64 getTileReadBufferSize() const;
+
+    // Whether block buffers hold whole samples (true for every compression but uncompressed and bi-level,
+    // which deliver samples as stored), and the bytes of each: the smallest of 1, 2, 4 or 8 holding NBPP
+    // bits.
+    bool deliversWholeSamples() const;
+    int getSampleContainerBytes() const;
 
     // Setters that also put the value into the map (only where the field is already present).
     void setActualBpp(PropertyMap& map, int value);

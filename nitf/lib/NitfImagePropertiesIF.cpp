@@ -102,11 +102,30 @@ __int64 CNitfImagePropertiesIF::getImageBufferSize() const {
     return m_bandCount * getImageBandBufferSize();
 }
 
+bool CNitfImagePropertiesIF::deliversWholeSamples() const {
+    switch (m_compressionType) {
+    case eCompressionNone:
+    case eCompressionUncompressed:
+    case eCompressionBilevel:
+        return false;
+    default:
+        return true;
+    }
+}
+
+int CNitfImagePropertiesIF::getSampleContainerBytes() const {
+    if (m_bpp <= 8)
+        return 1;
+    if (m_bpp <= 16)
+        return 2;
+    return m_bpp <= 32 ? 4 : 8;
+}
+
 int CNitfImagePropertiesIF::getTileBandWidthBufferSize() const {
-    // 12-bit JPEG samples (DCT or lossless) are delivered in two bytes each.
-    if (m_bpp == 12 &&
-        (m_compressionType == eCompressionJpeg || m_compressionType == eCompressionJpegLossless))
-        return m_tileWidth * 2;
+    // 12-bit JPEG samples (and every other depth that is not a whole container, in the sources that decode
+    // into whole samples) are delivered in the container, two bytes for 12 bits.
+    if (deliversWholeSamples() && m_bpp % 8 != 0 && m_bpp > 0 && m_bpp <= 64)
+        return static_cast<int>(static_cast<long long>(m_tileWidth) * getSampleContainerBytes());
     return static_cast<int>(static_cast<long long>(m_tileWidth) * m_bpp / 8);
 }
 
@@ -120,6 +139,18 @@ __int64 CNitfImagePropertiesIF::getTileBandBufferSize() const {
 
 __int64 CNitfImagePropertiesIF::getTileBufferSize() const {
     return m_bandCount * getTileBandBufferSize();
+}
+
+__int64 CNitfImagePropertiesIF::getTileBandReadBufferSize() const {
+    const __int64 rows = static_cast<__int64>(m_tileHeight) * getTileBandWidthBufferSize();
+    const __int64 stored = getTileBandBufferSize();
+    return rows > stored ? rows : stored;
+}
+
+__int64 CNitfImagePropertiesIF::getTileReadBufferSize() const {
+    const __int64 rows = static_cast<__int64>(m_tileHeight) * getTileWidthBufferSize();
+    const __int64 stored = getTileBufferSize();
+    return rows > stored ? rows : stored;
 }
 
 // Replaces an existing field's value with an integer; an absent field stays absent.
