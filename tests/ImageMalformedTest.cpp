@@ -110,7 +110,6 @@ TEST(ImageMalformed, GeometryBeyondTheFileIsRefused) {
          1,
          'B',
          "larger than the image data"},
-        {"an unknown interleaving", {{"IMODE", "X"}}, 3, 'B', "Unknown interleaving mode"},
         {"no blocks", {{"NBPR", "0000"}}, 1, 'B', "Invalid image geometry"},
         {"a negative block size", {{"NPPBV", "-001"}}, 1, 'B', "Invalid image geometry"},
     };
@@ -157,11 +156,31 @@ TEST(ImageMalformed, DataThatTheFileDoesNotHoldReadsAsZeros) {
     EXPECT_EQ(readEverything(bytes), "");
     EXPECT_NE(readEverything(bytes.substr(0, mask + 6)).find("block mask"), std::string::npos);
 
-    // Look-up tables longer than the rest of the file: the fields after them read as blanks past the end, so
-    // the image has no interleaving to read it by.
+}
+
+TEST(ImageMalformed, AnUnknownInterleavingLeavesEveryBlockAbsent) {
+    // An IMODE the library does not know: the source is handed out, but no block can be located.
+    Image unknown = smallImage();
+    unknown.bands = 3;
+    unknown.fields = {{"IMODE", "X"}};
+    {
+        TempFile file(fileWith(unknown));
+        CNitfFileReader reader;
+        ASSERT_TRUE(reader.open(file.path().c_str()));
+        std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(0));
+        ASSERT_TRUE(source);
+        EXPECT_EQ(source->getTileOffset(0), 0u);
+        EXPECT_TRUE(source->isBlockAbsent(0, 0, 0));
+        std::vector<char> block(64, 'x');
+        EXPECT_FALSE(source->readTileNonInterleaved(&reader, block.data(), 0, 0, 0));
+        EXPECT_EQ(block, std::vector<char>(64, 0));
+    }
+
+    // Look-up tables longer than the rest of the file: the fields after them read as blanks past the end,
+    // so the image has no geometry to read it by.
     Image lut = smallImage();
     lut.irep = "RGB/LUT";
     lut.bandInfo = {{"LU", "", {"abcd", "efgh", "ijkl"}}};
     lut.fields = {{"NELUT1", "99999"}};
-    EXPECT_NE(readEverything(fileWith(lut)).find("Unknown interleaving mode"), std::string::npos);
+    EXPECT_NE(readEverything(fileWith(lut)).find("Invalid image geometry"), std::string::npos);
 }

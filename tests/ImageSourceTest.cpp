@@ -145,8 +145,9 @@ TEST(ImageSourceRoundTrip, InterleavedBlocksAndWiderRowsHoldTheSameSamples) {
         EXPECT_EQ(wide[40 * 3 + 2 * 5] << 8 | wide[40 * 3 + 2 * 5 + 1],
                   nitfsample::sampleAt(image, 2, 3, 16 + 5));
         EXPECT_EQ(wide[39], 0xEE);
-        EXPECT_FALSE(open.source->readTileNonInterleaved(&open.reader, reinterpret_cast<char*>(wide.data()),
-                                                         31, 1, 0, 2))
+        EXPECT_THROW(open.source->readTileNonInterleaved(&open.reader, reinterpret_cast<char*>(wide.data()),
+                                                         31, 1, 0, 2),
+                     vexo::Exception)
             << "rows narrower than a block row";
     }
 }

@@ -395,8 +395,16 @@ TEST(JpegResampling, StreamsOfAnotherSizeFitTheirBlock) {
     for (int y = 0; y < 128; ++y)
         for (int x = 0; x < 128; ++x)
             ASSERT_EQ(up[y * 128 + x], small.at(map[x], map[y])) << x << ", " << y;
-    // The interleaved read fits the block as well.
-    EXPECT_EQ(enlarged.block(0, 0), up);
+    // A whole interleaved block is delivered as coded: the stream's rows at the block's row spacing, the
+    // rest of the buffer untouched.
+    std::vector<unsigned char> coded(128 * 128, 0xEE);
+    ASSERT_TRUE(enlarged.source().readTileInterleaved(enlarged.file(), reinterpret_cast<char*>(coded.data()),
+                                                      128, 0, 0));
+    for (int y : {0, 95})
+        for (int x : {0, 95})
+            EXPECT_EQ(coded[y * 128 + x], small.at(x, y)) << x << ", " << y;
+    EXPECT_EQ(coded[96], 0xEE);
+    EXPECT_EQ(coded[96 * 128], 0xEE);
 
     const Raster large = jpegtest::pattern(64, 64, 1, 8, 14);
     JpegFile reduced(jpegImage("C5", 32, 32, 1, 8, 'B', {jpegtest::encode(large, lossless(8))}));

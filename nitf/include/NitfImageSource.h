@@ -1,20 +1,54 @@
 // The base of every image data source: one object per image segment that hands out (or takes) the image's
 // pixels block by block. It owns the blocking geometry, the block mask and pad pixel of masked images, the
-// table of block offsets, the interleaving conversions and the bridge to the host projection record.
+// table of block offsets, the interleaving conversions and the bridge to the host projection record, and the
+// block mechanics every codec shares: which block entry holds a band, the one-block decode cache from which
+// the bands of a block are handed out, and the assembly of separately decoded bands into interleaved blocks.
+// A codec subclass locates its blocks (prepareTileOffsets) and decodes one block entry (decodeBlock).
+//
+// Samples in block buffers. Whatever the compression, a buffer holds tile-height rows `rowBytes` apart, of
+// one band (readTileNonInterleaved) or of every band pixel-interleaved (readTileInterleaved), with these
+// samples:
+//
+//   source (IC)                  NBPP 8, 16, 32, 64            other NBPP (1, 4, 11, 12, ...)
+//   uncompressed (NC, NM)        as stored: big-endian         as stored: one bit stream, most significant
+//   bi-level (C1, M1)            -                             bit first, rows running on without padding
+//   JPEG (C3, M3, C5, M5, I1)    whole samples in native byte order, in the smallest of 1, 2, 4 or 8
+//   VQ (C4, M4)                  bytes that holds NBPP bits (12-bit JPEG: two bytes), unsigned values
+//   JPEG 2000 (C8, M8)           zero-extended, PVTYPE SI values sign-extended
+//
+// CNitfImagePropertiesIF::deliversWholeSamples() tells the two columns apart and getSampleContainerBytes()
+// gives the container; getTileBandReadBufferSize() and getTileReadBufferSize() size the buffers. Row-
+// interleaved (IMODE R) bands come out of readTileNonInterleaved as packed rows whatever `rowBytes` says, and
+// readTileInterleaved of an IMODE R block gives the block as stored (row-interleaved): both kept for callers
+// that rely on them. For typed samples of any window, use CNitfRegionReader.
+//
+// Threads: a source is used by one thread at a time. Sources of one file on different readers (each with its
+// own stream) may be used on different threads at once.
 #pragma once
 
 #include <cstdio>
+#include <vector>
 
 #include "HostProjection.h"
 #include "NitfImagePropertiesIF.h"
 #include "NitfImageSubheader.h"
 
 class CNitfFile;
+class CNitfRegionReader;
 
 class CNitfImageSource {
 public:
     // The block offset that marks a block absent from the file (block mask entry 0xFFFFFFFF).
     static constexpr unsigned long long kAbsentBlock = 0xFFFFFFFFULL;
+
+    // What one decoded block entry holds (an entry is one band of a block for IMODE S, the whole block
+    // otherwise).
+    enum eBlockLayout_t {
+        eBlockBands,  // band after band, each of which decodes on its own (IMODE S, uncompressed "B")
+        eBlockPlanes, // band after band, decoded together
+        eBlockPixels, // pixel-interleaved
+        eBlockRows,   // row-interleaved: a row of each band in turn
+    };
 
     // Takes ownership of the sub-header; the file name is accepted and not used.
     CNitfImageSource(CNitfImageSubheader* subheader, char* fileName);
@@ -32,11 +66,10 @@ public:
     virtual bool validateParameters(FILE* fp);
     virtual void readStart(FILE* fp, long long dataOffset, long long dataLength);
     virtual void readProjection(FILE* fp, ProjInfo_t* info, bool flag);
-    // One whole block, pixel-interleaved, `rowBytes` apart.
-    virtual bool readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y) = 0;
-    // One band of one block, `rowBytes` apart.
-    virtual bool readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y,
-                                        int band) = 0;
+    // One whole block, pixel-interleaved, `rowBytes` apart; false when the block is absent or cannot be read.
+    virtual bool readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y);
+    // One band of one block, `rowBytes` apart; false when the block is absent or cannot be read.
+    virtual bool readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y, int band);
     virtual bool readBitmap(char* buffer, int x0, int y0, int width, int srcRows, int outWidthBits,
                             int outRows);
     virtual void readFinish();
@@ -62,6 +95,14 @@ public:
     __int64 getPadPixelValue() const { return m_padPixelValue; }
     void fillTileBlank(char* buffer, int rowStride);
 
+    // Whether (x, y) is a block of the image and `band` one of its bands.
+    bool isValidBlock(int x, int y, int band) const;
+    // Whether the file records block (x, y) (band `band` for IMODE S) as absent: a masked image's block mask
+    // entry 0xFFFFFFFF, or an image whose blocks could not be located. Such blocks read as zeros.
+    bool isBlockAbsent(int x, int y, int band) const;
+    // How many block entries have been decoded (read from the file) so far.
+    long long getDecodeCount() const { return m_decodeCount; }
+
     int getDisplayLevel();
     // Returns IDLVL as well, like getDisplayLevel: kept for callers that rely on it.
     int getAttachmentLevel();
@@ -69,6 +110,7 @@ public:
 
     CNitfImageSubheader* getImageSubheader() { return m_subheader; }
     CNitfImagePropertiesIF& getImageProperties() { return m_properties; }
+    const CNitfImagePropertiesIF& getImageProperties() const { return m_properties; }
     int getLutCount() { return m_subheader->getLutCount(); }
     CNitfLutSource* getLutSource(int index) { return m_subheader->getLutSource(index); }
     // "NITF Image error" whatever the code; released with free().
@@ -89,6 +131,25 @@ public:
                                       int bitsPerPixel, int band);
 
 protected:
+    // ---- what a codec supplies -----------------------------------------------------------------------------
+
+    // What a decoded block entry holds. The default follows IMODE: bands for "S", "B" and single-band images,
+    // pixels for "P", rows for "R".
+    virtual eBlockLayout_t getBlockLayout() const;
+    // Decodes block entry `entry` of the tile offset table into `buffer`, rows `rowBytes` apart. For the
+    // eBlockBands layout `band` is the band of the entry to decode (always 0 for IMODE S); for the others it is
+    // -1 and every band of the entry is decoded, in the layout's order. `interleaved` is true when the result
+    // is handed out as a whole interleaved block rather than as one band. Returns false when the block is
+    // absent; raises vexo::Exception when it cannot be decoded. `rowBytes` is at least the row size of the
+    // layout (planes lie tile height x `rowBytes`, or getTileBandBufferSize() for packed depths, apart).
+    virtual bool decodeBlock(FILE* fp, int entry, int band, unsigned char* buffer, int rowBytes,
+                             bool interleaved) = 0;
+    // Called on every band handed out by readTileNonInterleaved, after decoding (and band extraction): the
+    // place for amplitude mappings that apply to bands only.
+    virtual void finishBand(CNitfFile* file, unsigned char* buffer, int rowBytes);
+
+    // ---- shared mechanics for codecs -----------------------------------------------------------------------
+
     // Number of entries in the block tables: blocks × bands for IMODE S, blocks for B, P, R, 0 otherwise.
     // Raises vexo::Exception when the count does not fit in an int.
     int blockEntryCount() const;
@@ -99,6 +160,21 @@ protected:
     long long availableData() const { return m_availableData; }
     // Makes an empty tile offset table of blockEntryCount() entries (none for an unknown IMODE).
     void allocateTileOffsets();
+    // Fills the tile offset table from a block mask: entry i is mask entry i plus `start`, an absent entry
+    // (0xFFFFFFFF, or beyond the mask's `count` entries) stays absent.
+    void tileOffsetsFromMask(unsigned long long start, const unsigned int* blockMask, int count);
+    // The entry of the tile offset table that holds band `band` of block (x, y), and the band's place in it.
+    int blockEntry(int x, int y, int band) const;
+    int bandInEntry(int band) const;
+    // The offset of the entry, or kAbsentBlock for an index outside the table.
+    unsigned long long entryOffset(int entry) const;
+    // Bytes of one band row in a block buffer, and of one band plane of a decoded block.
+    int bandRowBytes() const { return m_properties.getTileBandWidthBufferSize(); }
+    long long bandPlaneBytes() const { return m_properties.getTileBandReadBufferSize(); }
+    // Whether samples are a packed bit stream rather than whole bytes.
+    bool isPacked() const;
+    // Forgets the cached block (for instance after the stream changed).
+    void dropCachedBlock() { m_cachedX = m_cachedY = -1; }
 
     CNitfImagePropertiesIF m_properties;
     unsigned long long* m_tileOffsets;
@@ -117,4 +193,25 @@ protected:
     int m_channelType;
     int m_channelIndex;
     int m_imageIndex;
+
+private:
+    friend class CNitfRegionReader;
+
+    // One band of block (x, y) into `buffer`, rows `rowBytes` apart (row-interleaved bands packed when
+    // `packRows` is set). False when the block is absent.
+    bool readBand(CNitfFile* file, unsigned char* buffer, int rowBytes, int x, int y, int band, bool packRows);
+    // Makes the cache hold block (x, y) decoded whole; false when the block is absent.
+    bool loadCachedBlock(FILE* fp, int x, int y);
+    // Band `band` of the cached block into `buffer`.
+    void extractCachedBand(unsigned char* buffer, int rowBytes, int band, bool packRows) const;
+    // Interleaves band planes (planeBytes apart, rows of bandRowBytes()) into pixel-interleaved rows.
+    void interleavePlanes(const unsigned char* planes, unsigned char* buffer, int rowBytes) const;
+    void checkRowBytes(int rowBytes, int wanted, const char* signature) const;
+    bool decodeCounted(FILE* fp, int entry, int band, unsigned char* buffer, int rowBytes, bool interleaved);
+
+    std::vector<unsigned char> m_cachedBlock; // one whole decoded block, for handing out its bands
+    int m_cachedX;
+    int m_cachedY;
+    std::vector<unsigned char> m_planes; // scratch for assembling interleaved blocks from their bands
+    long long m_decodeCount;
 };

@@ -6,7 +6,9 @@
 // it.
 //
 // Samples are delivered as 1 byte (up to 8 bits) or 2 bytes in native order (12 and 16 bits). A buffer for a
-// block holds tile-height rows of the row size given; three-band YCbCr streams are delivered as RGB.
+// block holds tile-height rows of the row size given; three-band YCbCr streams are delivered as RGB. A band
+// read fits a stream of another size to its block; a whole interleaved block is delivered as coded: a smaller
+// stream fills only its own rows and columns, a larger one is cut to the block.
 #pragma once
 
 #include <memory>
@@ -27,12 +29,6 @@ public:
 
     // Locates the blocks' streams and prepares the decoder.
     void readStart(FILE* fp, long long dataOffset, long long dataLength) override;
-    // All bands of block (x, y), pixel-interleaved; false when the block is absent. Raises vexo::Exception
-    // for a damaged stream.
-    bool readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y) override;
-    // Band `band` of block (x, y); false when the block is absent. Raises vexo::Exception for a damaged
-    // stream.
-    bool readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y, int band) override;
 
     // The file positions of the first `limit` start-of-image markers in `length` bytes from `offset`, in
     // order. Comment segments are skipped (also when they straddle a read chunk), so a marker pattern inside
@@ -40,8 +36,6 @@ public:
     static std::vector<unsigned long long> findStreamStarts(FILE* fp, long long offset, long long length,
                                                             size_t limit);
 
-    // How many JPEG streams this source has decoded.
-    long long getDecodeCount() const { return m_decodeCount; }
     // Whether a stream carried the "NITF0001.A" marker (12-bit amplitude mapping), and its offset.
     bool hasNitfApp6() const { return m_hasNitfApp6; }
     unsigned short getAmplitudeOffset() const { return m_amplitudeOffset; }
@@ -49,21 +43,25 @@ public:
 protected:
     void prepareTileOffsets(FILE* fp, long long dataOffset, long long dataLength, unsigned int* blockMask,
                             int count) override;
+    // One stream per band for IMODE S and single-band images; otherwise one stream holds every band.
+    eBlockLayout_t getBlockLayout() const override;
+    // Decodes the stream of one block entry; false when the block is absent. Raises vexo::Exception for a
+    // damaged stream.
+    bool decodeBlock(FILE* fp, int entry, int band, unsigned char* buffer, int rowBytes,
+                     bool interleaved) override;
+    // The IOMAPA amplitude mapping of 12-bit bands whose streams ask for it.
+    void finishBand(CNitfFile* file, unsigned char* buffer, int rowBytes) override;
 
 private:
     // How IREP sets libjpeg's colour spaces.
     enum eColour_t { eColourAsStored, eColourRgb, eColourMulti, eColourYCbCr };
 
-    bool isBandSequential() const;
     int sampleBytes() const;
-    bool isValidBlock(int x, int y, int band) const;
-    // Decodes the stream of block entry `index` into `buffer` as `components` samples per pixel, fitted to
-    // the block size; false when the block is absent.
-    bool decodeBlock(FILE* fp, int index, unsigned char* buffer, int rowBytes, int components,
-                     bool interleaved);
     void checkStream(int rowBytes, int components) const;
     void setColourSpaces(bool interleaved);
     void readRowsResampled(unsigned char* buffer, int rowBytes, int components);
+    // The stream's rows as coded, cut to the block.
+    void readRowsAsCoded(unsigned char* buffer, int rowBytes, int components);
     // The bytes from `offset` to the next block's stream or the end of the image data.
     unsigned long long streamLength(unsigned long long offset) const;
     void applyAmplitudeMapping(unsigned char* buffer, int rowBytes, CNitfFile* file);
@@ -71,17 +69,12 @@ private:
     std::unique_ptr<CJpegStreamDecoder> m_decoder;
     std::unique_ptr<CJpegAmplitudeMap> m_amplitudeMap;
     std::vector<unsigned long long> m_sortedOffsets;
-    std::vector<unsigned char> m_bandSequentialBuffer;
-    std::vector<unsigned char> m_cachedBlockBuffer;
     std::vector<unsigned char> m_rowBuffer;
     std::vector<unsigned char*> m_rowPointers;
-    int m_cachedX;
-    int m_cachedY;
     unsigned long long m_dataEnd;
     eColour_t m_colour;
     unsigned short m_amplitudeOffset;
     unsigned short m_mappedOffset; // the amplitude offset m_amplitudeMap was built with
     bool m_hasNitfApp6;
     bool m_method3Warned;
-    long long m_decodeCount;
 };

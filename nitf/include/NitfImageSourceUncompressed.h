@@ -14,8 +14,6 @@ public:
 
     __int64 computeStorageLength() override;
     void readStart(FILE* fp, long long dataOffset, long long dataLength) override;
-    bool readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y) override;
-    bool readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y, int band) override;
     bool readBitmap(char* buffer, int x0, int y0, int width, int srcRows, int outWidthBits,
                     int outRows) override;
     void writeStart(FILE* fp, long long dataOffset, long long dataLength) override;
@@ -29,33 +27,27 @@ public:
 protected:
     void prepareTileOffsets(FILE* fp, long long dataOffset, long long dataLength, unsigned int* blockMask,
                             int count) override;
+    // Reads the stored bytes of one band of a block (eBlockBands) or of a whole block; absent blocks, and
+    // what the file does not hold, read as zeros.
+    bool decodeBlock(FILE* fp, int entry, int band, unsigned char* buffer, int rowBytes,
+                     bool interleaved) override;
 
 private:
-    bool isPixelOrRowInterleaved() const;
-    bool isPacked() const { return m_properties.getBpp() % 8 != 0; }
-    bool isValidBlock(int x, int y) const;
     // Reads `size` stored bytes at `offset` (absent: zeros) into `buffer`: for byte-multiple depths as rows
     // of `storedRow` bytes placed `rowBytes` apart, for packed depths as one bit stream.
-    bool readStored(FILE* fp, unsigned long long offset, char* buffer, long long size, int storedRow,
+    void readStored(FILE* fp, unsigned long long offset, unsigned char* buffer, long long size, int storedRow,
                     int rowBytes);
-    // Makes the block buffer hold block (x, y) of a pixel- or row-interleaved image.
-    bool loadBlockCache(CNitfFile* file, int x, int y);
-    void extractBand(char* buffer, int rowBytes, int band);
-    // A buffer of `size` bytes the image data can justify, or a raised vexo::Exception.
-    char* allocateJustified(long long size, const char* what);
+    // Refuses a buffer of `size` bytes that the image data in the file cannot justify.
+    void checkJustified(long long size, const char* what) const;
     // Lays the blocks of a bi-level image out as one image-wide bitmap.
     char* ReassemblingBitmap(const char* data, long long dataSize, long long dataOffset, int tileWidth,
                              int tileHeight, int tilesX, int tilesY, long long rowBits, long long rows);
     void buildBitmap(FILE* fp);
+    void computeSizes();
 
     long long m_tileBandBytes; // one band of one block, as stored
     long long m_tileBytes;     // one block, every band
-    // IMODE P and R: the last whole block read, for handing out its bands (block m_cacheX, m_cacheY; -1 when
-    // none). IMODE B and S: scratch for interleaving the bands of a block. The work buffer of the base holds
-    // the image-wide bitmap of a bi-level image.
-    char* m_blockBuffer;
-    int m_cacheX;
-    int m_cacheY;
+    // The work buffer of the base holds the image-wide bitmap of a bi-level image.
     long long m_bitmapRowBits;
     long long m_bitmapRows;
 };

@@ -1,5 +1,6 @@
 #include "NitfImageSource.h"
 
+#include <algorithm>
 #include <climits>
 #include <cstdint>
 #include <cstring>
@@ -13,6 +14,7 @@
 #include "HostFile.h"
 #include "HostMemory.h"
 #include "NitfFile.h"
+#include "PackedBits.h"
 #include "Raise.h"
 
 static const char kSourceFile[] = "nitf/lib/NitfImageSource";
@@ -21,7 +23,7 @@ CNitfImageSource::CNitfImageSource(CNitfImageSubheader* subheader, char*)
     : m_tileOffsets(nullptr), m_tileOffsetCount(0), m_blockMask(nullptr), m_blockMaskCount(0),
       m_subheader(subheader), m_workBuffer(nullptr), m_workBufferSize(0), m_workBufferUsed(0),
       m_padPixelValue(0), m_hasPadPixel(false), m_dataOffset(0), m_dataLength(0), m_availableData(0),
-      m_channelType(0), m_channelIndex(-1), m_imageIndex(0) {
+      m_channelType(0), m_channelIndex(-1), m_imageIndex(0), m_cachedX(-1), m_cachedY(-1), m_decodeCount(0) {
     if (m_subheader)
         m_properties.setProperties(m_subheader->getProperties());
 }
@@ -141,12 +143,18 @@ void CNitfImageSource::writeStart(FILE*, long long, long long) {
     allocateTileOffsets();
 }
 
-// The georeferencing bridge. The sub-header's CNitfGeorefInfo will read the corners into the host record with
-// the actual image size (NCOLS x NROWS) and write them with the block-padded size (NBPR x NPPBH, NBPC x
-// NPPBV); until it can, the record is left as it is and nothing is written.
-void CNitfImageSource::readProjection(FILE*, ProjInfo_t*, bool) {}
+// The georeferencing bridge. The sub-header's CNitfGeorefInfo reads the corners into the host record with
+// the actual image size (NCOLS x NROWS) and writes them with the block-padded size (NBPR x NPPBH, NBPC x
+// NPPBV). Until it can, both say so rather than silently leaving the record as it was.
+void CNitfImageSource::readProjection(FILE*, ProjInfo_t*, bool) {
+    NITF_RAISE("Reading georeferencing into a projection record is not yet supported by this build",
+               "void __cdecl CNitfImageSource::readProjection(" NITF_FILE_SIG ",struct ProjInfo_t *,bool)");
+}
 
-void CNitfImageSource::writeProjection(FILE*, ProjInfo_t*) {}
+void CNitfImageSource::writeProjection(FILE*, ProjInfo_t*) {
+    NITF_RAISE("Writing georeferencing from a projection record is not yet supported by this build",
+               "void __cdecl CNitfImageSource::writeProjection(" NITF_FILE_SIG ",struct ProjInfo_t *)");
+}
 
 bool CNitfImageSource::readBitmap(char*, int, int, int, int, int, int) {
     return false;
@@ -177,14 +185,218 @@ bool CNitfImageSource::readTileNonInterleaved(CNitfFile* file, char* buffer, int
         ok = false;
     }
     if (!ok && buffer) {
-        // Packed depths fill the band's whole bit stream, which is longer than whole rows of truncated size.
-        const long long rows = static_cast<long long>(m_properties.getTileHeight()) * rowBytes;
-        const long long packed = m_properties.getTileBandBufferSize();
-        const long long size = rows > packed ? rows : packed;
+        const long long size = m_properties.getTileBandReadBufferSize();
         if (size > 0)
             std::memset(buffer, 0, static_cast<size_t>(size));
     }
     return ok;
+}
+
+// ---- block mechanics --------------------------------------------------------------------------------------
+
+bool CNitfImageSource::isValidBlock(int x, int y, int band) const {
+    return x >= 0 && y >= 0 && band >= 0 && x < m_properties.getTileCountX() &&
+           y < m_properties.getTileCountY() && band < m_properties.getBandCount();
+}
+
+bool CNitfImageSource::isPacked() const {
+    return !m_properties.deliversWholeSamples() && m_properties.getBpp() % 8 != 0;
+}
+
+int CNitfImageSource::blockEntry(int x, int y, int band) const {
+    return m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandSequential
+               ? m_properties.getTileIndex(x, y, band)
+               : m_properties.getTileIndex(x, y);
+}
+
+int CNitfImageSource::bandInEntry(int band) const {
+    return m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandSequential ? 0 : band;
+}
+
+unsigned long long CNitfImageSource::entryOffset(int entry) const {
+    if (!m_tileOffsets || entry < 0 || entry >= m_tileOffsetCount)
+        return kAbsentBlock;
+    return m_tileOffsets[entry];
+}
+
+bool CNitfImageSource::isBlockAbsent(int x, int y, int band) const {
+    return !isValidBlock(x, y, band) || entryOffset(blockEntry(x, y, band)) == kAbsentBlock;
+}
+
+void CNitfImageSource::tileOffsetsFromMask(unsigned long long start, const unsigned int* blockMask, int count) {
+    for (int i = 0; m_tileOffsets && i < m_tileOffsetCount; ++i) {
+        const unsigned int offset = i < count ? blockMask[i] : 0xFFFFFFFFu;
+        m_tileOffsets[i] = offset == 0xFFFFFFFFu ? kAbsentBlock : start + offset;
+    }
+}
+
+CNitfImageSource::eBlockLayout_t CNitfImageSource::getBlockLayout() const {
+    if (m_properties.getBandCount() < 2)
+        return eBlockBands;
+    switch (m_properties.getInterleavingType()) {
+    case CNitfImagePropertiesIF::eBandInterleavedByPixel:
+        return eBlockPixels;
+    case CNitfImagePropertiesIF::eBandInterleavedByRow:
+        return eBlockRows;
+    default:
+        return eBlockBands;
+    }
+}
+
+void CNitfImageSource::finishBand(CNitfFile*, unsigned char*, int) {}
+
+void CNitfImageSource::checkRowBytes(int rowBytes, int wanted, const char* signature) const {
+    if (!isPacked() && rowBytes < wanted)
+        NITF_RAISE_FORMAT(signature, "Rows of %d bytes cannot hold a block row of %d bytes", rowBytes, wanted);
+}
+
+bool CNitfImageSource::decodeCounted(FILE* fp, int entry, int band, unsigned char* buffer, int rowBytes,
+                                     bool interleaved) {
+    ++m_decodeCount;
+    return decodeBlock(fp, entry, band, buffer, rowBytes, interleaved);
+}
+
+bool CNitfImageSource::readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y,
+                                              int band) {
+    FILE* fp = file ? file->getInputStream() : nullptr;
+    if (!fp || !buffer || !m_tileOffsets || !isValidBlock(x, y, band))
+        return false;
+    return readBand(file, packedbits::bytes(buffer), rowBytes, x, y, band, true);
+}
+
+bool CNitfImageSource::readBand(CNitfFile* file, unsigned char* buffer, int rowBytes, int x, int y, int band,
+                                bool packRows) {
+    checkRowBytes(rowBytes, bandRowBytes(),
+                  "bool __cdecl CNitfImageSource::readTileNonInterleaved(class CNitfFile *,char *,int,int,int,"
+                  "int)");
+    FILE* fp = file->getInputStream();
+    if (getBlockLayout() == eBlockBands) {
+        if (!decodeCounted(fp, blockEntry(x, y, band), bandInEntry(band), buffer, rowBytes, false))
+            return false;
+    } else {
+        // Every band of the block comes out of one decode: keep it for the bands that follow.
+        if (!loadCachedBlock(fp, x, y))
+            return false;
+        extractCachedBand(buffer, rowBytes, band, packRows);
+    }
+    finishBand(file, buffer, rowBytes);
+    return true;
+}
+
+bool CNitfImageSource::readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y) {
+    FILE* fp = file ? file->getInputStream() : nullptr;
+    if (!fp || !buffer || !m_tileOffsets || !isValidBlock(x, y, 0))
+        return false;
+    checkRowBytes(rowBytes, m_properties.getTileWidthBufferSize(),
+                  "bool __cdecl CNitfImageSource::readTileInterleaved(class CNitfFile *,char *,int,int,int)");
+    unsigned char* out = packedbits::bytes(buffer);
+    const int bands = m_properties.getBandCount();
+    const eBlockLayout_t layout = getBlockLayout();
+    if (bands == 1 || layout == eBlockPixels || layout == eBlockRows)
+        return decodeCounted(fp, blockEntry(x, y, 0), layout == eBlockBands ? 0 : -1, out, rowBytes, true);
+
+    // Band after band: each band as a band read would give it, then interleaved.
+    const long long plane = bandPlaneBytes();
+    const unsigned char* planes = nullptr;
+    if (layout == eBlockBands) {
+        m_planes.resize(static_cast<size_t>(plane * bands));
+        for (int band = 0; band < bands; ++band)
+            if (!readBand(file, m_planes.data() + band * plane, bandRowBytes(), x, y, band, true))
+                return false;
+        planes = m_planes.data();
+    } else {
+        if (!loadCachedBlock(fp, x, y))
+            return false;
+        planes = m_cachedBlock.data();
+    }
+    interleavePlanes(planes, out, rowBytes);
+    return true;
+}
+
+bool CNitfImageSource::loadCachedBlock(FILE* fp, int x, int y) {
+    if (x == m_cachedX && y == m_cachedY)
+        return true;
+    m_cachedX = m_cachedY = -1;
+    const bool planes = getBlockLayout() == eBlockPlanes;
+    const long long size =
+        planes ? bandPlaneBytes() * m_properties.getBandCount() : m_properties.getTileReadBufferSize();
+    if (m_cachedBlock.size() < static_cast<size_t>(size))
+        m_cachedBlock.resize(static_cast<size_t>(size));
+    const int rowBytes = planes ? bandRowBytes() : m_properties.getTileWidthBufferSize();
+    if (!decodeCounted(fp, blockEntry(x, y, 0), -1, m_cachedBlock.data(), rowBytes, true))
+        return false;
+    m_cachedX = x;
+    m_cachedY = y;
+    return true;
+}
+
+void CNitfImageSource::extractCachedBand(unsigned char* buffer, int rowBytes, int band, bool packRows) const {
+    const int width = m_properties.getTileWidth(), height = m_properties.getTileHeight();
+    const int bands = m_properties.getBandCount();
+    const unsigned char* block = m_cachedBlock.data();
+    const eBlockLayout_t layout = getBlockLayout();
+    char* out = reinterpret_cast<char*>(buffer);
+    char* in = const_cast<char*>(reinterpret_cast<const char*>(block));
+    if (!isPacked()) {
+        const int sampleBits = 8 * (bandRowBytes() / std::max(width, 1));
+        const size_t row = static_cast<size_t>(bandRowBytes());
+        switch (layout) {
+        case eBlockPixels:
+            deinterleavePixelToBand(out, rowBytes, in, height, width, bands, sampleBits, band);
+            return;
+        case eBlockRows:
+            if (packRows) {
+                deinterleaveRowToBand(out, rowBytes, in, height, width, bands, sampleBits, band);
+                return;
+            }
+            for (int r = 0; r < height; ++r)
+                std::memcpy(buffer + static_cast<size_t>(r) * rowBytes, block + (r * bands + band) * row, row);
+            return;
+        default: {
+            const unsigned char* plane = block + band * bandPlaneBytes();
+            for (int r = 0; r < height; ++r)
+                std::memcpy(buffer + static_cast<size_t>(r) * rowBytes, plane + r * row, row);
+            return;
+        }
+        }
+    }
+    // Packed depths come out as the band's bit stream, laid out as one band of an IMODE B block is stored.
+    const int bits = m_properties.getBpp();
+    const uint64_t rowBits = static_cast<uint64_t>(width) * bits;
+    if (layout == eBlockPlanes || layout == eBlockBands) {
+        std::memcpy(buffer, block + band * bandPlaneBytes(), static_cast<size_t>(bandPlaneBytes()));
+        return;
+    }
+    std::memset(buffer, 0, static_cast<size_t>(m_properties.getTileBandBufferSize()));
+    for (uint64_t r = 0; r < static_cast<uint64_t>(height); ++r) {
+        if (layout == eBlockRows) {
+            packedbits::copyBits(buffer, r * rowBits, block, (r * bands + band) * rowBits, rowBits);
+            continue;
+        }
+        for (uint64_t c = 0; c < static_cast<uint64_t>(width); ++c) {
+            const uint64_t sample = r * width + c;
+            packedbits::copyBits(buffer, sample * bits, block, (sample * bands + band) * bits, bits);
+        }
+    }
+}
+
+void CNitfImageSource::interleavePlanes(const unsigned char* planes, unsigned char* buffer, int rowBytes) const {
+    const int width = m_properties.getTileWidth(), height = m_properties.getTileHeight();
+    const int bands = m_properties.getBandCount();
+    const long long plane = bandPlaneBytes();
+    if (!isPacked()) {
+        const int sampleBits = 8 * (bandRowBytes() / std::max(width, 1));
+        deinterleaveBandToPixel(reinterpret_cast<char*>(buffer), rowBytes,
+                                const_cast<char*>(reinterpret_cast<const char*>(planes)), height, width, bands,
+                                sampleBits);
+        return;
+    }
+    const int bits = m_properties.getBpp();
+    std::memset(buffer, 0, static_cast<size_t>(m_properties.getTileBufferSize()));
+    const uint64_t samples = static_cast<uint64_t>(width) * height;
+    for (int band = 0; band < bands; ++band)
+        for (uint64_t i = 0; i < samples; ++i)
+            packedbits::copyBits(buffer, (i * bands + band) * bits, planes + band * plane, i * bits, bits);
 }
 
 // ---- block mask record ------------------------------------------------------------------------------------

@@ -32,9 +32,8 @@ bool startsWithNoCase(const std::string& text, const char* prefix) {
 } // namespace
 
 CNitfImageSourceJpeg::CNitfImageSourceJpeg(CNitfImageSubheader* subheader, char* fileName)
-    : CNitfImageSource(subheader, fileName), m_cachedX(-1), m_cachedY(-1), m_dataEnd(0),
-      m_colour(eColourAsStored), m_amplitudeOffset(0), m_mappedOffset(0), m_hasNitfApp6(false),
-      m_method3Warned(false), m_decodeCount(0) {}
+    : CNitfImageSource(subheader, fileName), m_dataEnd(0), m_colour(eColourAsStored), m_amplitudeOffset(0),
+      m_mappedOffset(0), m_hasNitfApp6(false), m_method3Warned(false) {}
 
 CNitfImageSourceJpeg::~CNitfImageSourceJpeg() = default;
 
@@ -113,11 +112,7 @@ void CNitfImageSourceJpeg::prepareTileOffsets(FILE* fp, long long dataOffset, lo
     if (!m_tileOffsets || entries == 0)
         return;
     if (blockMask) {
-        for (int i = 0; i < entries; ++i) {
-            const unsigned long long entry = i < count ? blockMask[i] : kAbsentBlock;
-            m_tileOffsets[i] =
-                entry == kAbsentBlock ? kAbsentBlock : entry + static_cast<unsigned long long>(dataOffset);
-        }
+        tileOffsetsFromMask(static_cast<unsigned long long>(dataOffset), blockMask, count);
         return;
     }
     // Streams follow each other in block order (band after band for IMODE S). A block whose stream is not
@@ -175,103 +170,24 @@ void CNitfImageSourceJpeg::readStart(FILE* fp, long long dataOffset, long long d
 // ---- reading blocks
 // ----------------------------------------------------------------------------------------
 
-bool CNitfImageSourceJpeg::isBandSequential() const {
-    return m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandSequential;
-}
-
 int CNitfImageSourceJpeg::sampleBytes() const {
     return m_properties.getBpp() <= 8 ? 1 : 2;
 }
 
-bool CNitfImageSourceJpeg::isValidBlock(int x, int y, int band) const {
-    return m_decoder && m_tileOffsets && x >= 0 && y >= 0 && band >= 0 && x < m_properties.getTileCountX() &&
-           y < m_properties.getTileCountY() && band < m_properties.getBandCount() &&
-           m_properties.getTileWidth() > 0 && m_properties.getTileHeight() > 0;
+CNitfImageSource::eBlockLayout_t CNitfImageSourceJpeg::getBlockLayout() const {
+    const bool bandSequential =
+        m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandSequential;
+    return bandSequential || m_properties.getBandCount() < 2 ? eBlockBands : eBlockPixels;
 }
 
-bool CNitfImageSourceJpeg::readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y) {
-    FILE* fp = file ? file->getInputStream() : nullptr;
-    if (!fp || !buffer || !isValidBlock(x, y, 0))
+bool CNitfImageSourceJpeg::decodeBlock(FILE* fp, int entry, int, unsigned char* buffer, int rowBytes,
+                                       bool interleaved) {
+    const unsigned long long offset = entryOffset(entry);
+    if (!m_decoder || offset == kAbsentBlock || m_properties.getTileWidth() <= 0 ||
+        m_properties.getTileHeight() <= 0)
         return false;
-    const int bands = m_properties.getBandCount();
-    unsigned char* out = reinterpret_cast<unsigned char*>(buffer);
-    if (!isBandSequential())
-        return decodeBlock(fp, m_properties.getTileIndex(x, y), out, rowBytes, bands, true);
-    if (bands == 1)
-        return decodeBlock(fp, m_properties.getTileIndex(x, y, 0), out, rowBytes, 1, true);
-
-    // One stream per band: decode each into its plane, then interleave.
-    const int width = m_properties.getTileWidth();
-    const int height = m_properties.getTileHeight();
-    const int bytes = sampleBytes();
-    if (static_cast<long long>(width) * bands * bytes > rowBytes)
-        NITF_RAISE_FORMAT(
-            "bool __cdecl CNitfImageSourceJpeg::readTileInterleaved(class CNitfFile *,char *,int,"
-            "int,int)",
-            "Rows of %d bytes cannot hold %d pixels of %d bands", rowBytes, width, bands);
-    const int planeRow = width * bytes;
-    const size_t planeSize = static_cast<size_t>(planeRow) * height;
-    m_bandSequentialBuffer.resize(planeSize * bands);
-    char* planes = reinterpret_cast<char*>(m_bandSequentialBuffer.data());
-    for (int band = 0; band < bands; ++band)
-        if (!readTileNonInterleaved(file, planes + band * planeSize, planeRow, x, y, band))
-            return false;
-    deinterleaveBandToPixel(buffer, rowBytes, planes, height, width, bands, 8 * bytes);
-    return true;
-}
-
-bool CNitfImageSourceJpeg::readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y,
-                                                  int band) {
-    FILE* fp = file ? file->getInputStream() : nullptr;
-    if (!fp || !buffer || !isValidBlock(x, y, band))
-        return false;
-    const int bands = m_properties.getBandCount();
-    const int width = m_properties.getTileWidth();
-    const int height = m_properties.getTileHeight();
-    const int bytes = sampleBytes();
-    unsigned char* out = reinterpret_cast<unsigned char*>(buffer);
-
-    if (!isBandSequential() && bands >= 2) {
-        // All bands share one stream: decode the block once and hand out its bands one by one.
-        if (x != m_cachedX || y != m_cachedY) {
-            const int blockRow = width * bands * bytes;
-            m_cachedBlockBuffer.resize(static_cast<size_t>(blockRow) * height);
-            m_cachedX = m_cachedY = -1;
-            if (!readTileInterleaved(file, reinterpret_cast<char*>(m_cachedBlockBuffer.data()), blockRow, x,
-                                     y))
-                return false;
-            m_cachedX = x;
-            m_cachedY = y;
-        }
-        if (static_cast<long long>(width) * bytes > rowBytes)
-            NITF_RAISE_FORMAT("bool __cdecl CNitfImageSourceJpeg::readTileNonInterleaved(class CNitfFile *,"
-                              "char *,int,int,int,int)",
-                              "Rows of %d bytes cannot hold %d samples", rowBytes, width);
-        deinterleavePixelToBand(buffer, rowBytes, reinterpret_cast<char*>(m_cachedBlockBuffer.data()), height,
-                                width, bands, 8 * bytes, band);
-    } else {
-        const int index =
-            isBandSequential() ? m_properties.getTileIndex(x, y, band) : m_properties.getTileIndex(x, y);
-        if (!decodeBlock(fp, index, out, rowBytes, 1, false))
-            return false;
-    }
-    if (m_hasNitfApp6)
-        applyAmplitudeMapping(out, rowBytes, file);
-    return true;
-}
-
-// ---- decoding one stream
-// -----------------------------------------------------------------------------------
-
-bool CNitfImageSourceJpeg::decodeBlock(FILE* fp, int index, unsigned char* buffer, int rowBytes,
-                                       int components, bool interleaved) {
-    if (index < 0 || index >= m_tileOffsetCount)
-        return false;
-    const unsigned long long offset = m_tileOffsets[index];
-    if (offset == kAbsentBlock)
-        return false;
+    const int components = getBlockLayout() == eBlockPixels ? m_properties.getBandCount() : 1;
     m_decoder->readHeader(fp, offset, streamLength(offset));
-    ++m_decodeCount;
     if (m_decoder->sawAmplitudeMarker()) {
         m_hasNitfApp6 = true;
         m_amplitudeOffset = m_decoder->amplitudeOffset();
@@ -281,7 +197,7 @@ bool CNitfImageSourceJpeg::decodeBlock(FILE* fp, int index, unsigned char* buffe
     m_decoder->start();
     if (m_decoder->outputComponents() != components)
         NITF_RAISE_FORMAT(kDecodeSignature,
-                          "The JPEG stream of block %d has %d components where %d are expected", index,
+                          "The JPEG stream of block %d has %d components where %d are expected", entry,
                           m_decoder->outputComponents(), components);
 
     const int height = m_properties.getTileHeight();
@@ -290,11 +206,19 @@ bool CNitfImageSourceJpeg::decodeBlock(FILE* fp, int index, unsigned char* buffe
         for (int row = 0; row < height; ++row)
             m_rowPointers[row] = buffer + static_cast<size_t>(row) * rowBytes;
         m_decoder->readRows(m_rowPointers.data(), height);
+    } else if (interleaved) {
+        // Whole interleaved blocks are delivered as coded, without fitting.
+        readRowsAsCoded(buffer, rowBytes, components);
     } else {
         readRowsResampled(buffer, rowBytes, components);
     }
     m_decoder->finish();
     return true;
+}
+
+void CNitfImageSourceJpeg::finishBand(CNitfFile* file, unsigned char* buffer, int rowBytes) {
+    if (m_hasNitfApp6)
+        applyAmplitudeMapping(buffer, rowBytes, file);
 }
 
 // Three-component streams take their colour spaces from IREP: RGB (and MULTI when read as a whole) as
@@ -336,6 +260,18 @@ void CNitfImageSourceJpeg::checkStream(int rowBytes, int components) const {
     if (width * components * sampleBytes() > rowBytes)
         NITF_RAISE_FORMAT(kDecodeSignature, "Rows of %d bytes cannot hold %lld pixels of %d samples",
                           rowBytes, width, components);
+}
+
+void CNitfImageSourceJpeg::readRowsAsCoded(unsigned char* buffer, int rowBytes, int components) {
+    const size_t pixelBytes = static_cast<size_t>(components) * sampleBytes();
+    const int width = std::min(m_decoder->width(), m_properties.getTileWidth());
+    const int rows = std::min(m_decoder->height(), m_properties.getTileHeight());
+    m_rowBuffer.resize(static_cast<size_t>(m_decoder->width()) * pixelBytes);
+    unsigned char* row = m_rowBuffer.data();
+    for (int r = 0; r < rows; ++r) {
+        m_decoder->readRows(&row, 1);
+        std::memcpy(buffer + static_cast<size_t>(r) * rowBytes, row, width * pixelBytes);
+    }
 }
 
 void CNitfImageSourceJpeg::readRowsResampled(unsigned char* buffer, int rowBytes, int components) {

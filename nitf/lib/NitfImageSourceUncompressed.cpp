@@ -10,6 +10,7 @@
 #include "HostFile.h"
 #include "HostMemory.h"
 #include "NitfFile.h"
+#include "PackedBits.h"
 #include "Raise.h"
 
 static const char kSourceFile[] = "nitf/lib/NitfImageSourceUncompressed";
@@ -27,68 +28,18 @@ void readAt(FILE* fp, unsigned long long offset, char* buffer, size_t size) {
     CDataStream::readZeroFilledAt(fp, position, buffer, size);
 }
 
-// ---- bit streams, most significant bit first --------------------------------------------------------------
-
-inline bool getBit(const unsigned char* data, uint64_t bit) {
-    return (data[bit >> 3] >> (7 - (bit & 7))) & 1;
-}
-
-inline void putBit(unsigned char* data, uint64_t bit, bool value) {
-    const unsigned char mask = static_cast<unsigned char>(0x80 >> (bit & 7));
-    if (value)
-        data[bit >> 3] |= mask;
-    else
-        data[bit >> 3] &= static_cast<unsigned char>(~mask);
-}
-
-// Copies `count` bits between arbitrary bit positions; whole destination bytes are assembled at once.
-void copyBits(unsigned char* dst, uint64_t dstBit, const unsigned char* src, uint64_t srcBit,
-              uint64_t count) {
-    for (; count > 0 && (dstBit & 7) != 0; --count)
-        putBit(dst, dstBit++, getBit(src, srcBit++));
-    unsigned char* out = dst + (dstBit >> 3);
-    const unsigned char* in = src + (srcBit >> 3);
-    const unsigned shift = srcBit & 7;
-    const uint64_t bytes = count >> 3;
-    if (shift == 0) {
-        std::memcpy(out, in, bytes);
-    } else {
-        // The last byte assembled needs the first bits of in[bytes], which still belong to the copied range.
-        for (uint64_t i = 0; i < bytes; ++i)
-            out[i] = static_cast<unsigned char>((in[i] << shift) | (in[i + 1] >> (8 - shift)));
-    }
-    dstBit += bytes << 3;
-    srcBit += bytes << 3;
-    for (count &= 7; count > 0; --count)
-        putBit(dst, dstBit++, getBit(src, srcBit++));
-}
-
-void setBits(unsigned char* data, uint64_t bit, uint64_t count, bool value) {
-    for (; count > 0; --count)
-        putBit(data, bit++, value);
-}
-
-void invertBits(unsigned char* data, uint64_t bit, uint64_t count) {
-    for (; count > 0; --count, ++bit)
-        putBit(data, bit, !getBit(data, bit));
-}
-
-unsigned char* bytes(char* data) {
-    return reinterpret_cast<unsigned char*>(data);
-}
-const unsigned char* bytes(const char* data) {
-    return reinterpret_cast<const unsigned char*>(data);
-}
+using packedbits::bytes;
+using packedbits::copyBits;
+using packedbits::invertBits;
+using packedbits::setBits;
 
 } // namespace
 
 CNitfImageSourceUncompressed::CNitfImageSourceUncompressed(CNitfImageSubheader* subheader, char* fileName)
-    : CNitfImageSource(subheader, fileName), m_tileBandBytes(0), m_tileBytes(0), m_blockBuffer(nullptr),
-      m_cacheX(-1), m_cacheY(-1), m_bitmapRowBits(0), m_bitmapRows(0) {}
+    : CNitfImageSource(subheader, fileName), m_tileBandBytes(0), m_tileBytes(0), m_bitmapRowBits(0),
+      m_bitmapRows(0) {}
 
-CNitfImageSourceUncompressed::~CNitfImageSourceUncompressed() {
-    free(m_blockBuffer);
-}
+CNitfImageSourceUncompressed::~CNitfImageSourceUncompressed() = default;
 
 __int64 CNitfImageSourceUncompressed::computeStorageLength() {
     return m_properties.getImageBufferSize() + computeBlockMaskStorageLength();
@@ -102,30 +53,17 @@ bool CNitfImageSourceUncompressed::isWriteable() {
            mode == CNitfImagePropertiesIF::eBandInterleavedByRow || m_properties.getBandCount() < 2;
 }
 
-bool CNitfImageSourceUncompressed::isPixelOrRowInterleaved() const {
-    const CNitfImagePropertiesIF::eInterleavingType_t mode = m_properties.getInterleavingType();
-    return mode == CNitfImagePropertiesIF::eBandInterleavedByPixel ||
-           mode == CNitfImagePropertiesIF::eBandInterleavedByRow;
-}
-
-bool CNitfImageSourceUncompressed::isValidBlock(int x, int y) const {
-    return x >= 0 && y >= 0 && x < m_properties.getTileCountX() && y < m_properties.getTileCountY();
-}
-
 // ---- block offsets ----------------------------------------------------------------------------------------
 
 void CNitfImageSourceUncompressed::prepareTileOffsets(FILE*, long long dataOffset, long long,
                                                       unsigned int* blockMask, int count) {
     if (!m_tileOffsets)
         return;
-    const int entries = m_tileOffsetCount;
     if (blockMask) {
-        for (int i = 0; i < entries; ++i) {
-            const unsigned int offset = i < count ? blockMask[i] : 0xFFFFFFFFu;
-            m_tileOffsets[i] = offset == 0xFFFFFFFFu ? kAbsentBlock : dataOffset + offset;
-        }
+        tileOffsetsFromMask(static_cast<unsigned long long>(dataOffset), blockMask, count);
         return;
     }
+    const int entries = m_tileOffsetCount;
     // Stored one after the other: band-blocks for IMODE S (the blocks of each band follow the previous
     // band's), whole blocks otherwise. checkGeometry keeps these products within 2^62.
     const long long entryBytes = m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandSequential
@@ -136,67 +74,52 @@ void CNitfImageSourceUncompressed::prepareTileOffsets(FILE*, long long dataOffse
 }
 
 unsigned long long CNitfImageSourceUncompressed::getTileOffset(int x, int y, int band) const {
-    if (!m_tileOffsets || !isValidBlock(x, y) || band < 0 || band >= m_properties.getBandCount())
+    if (!isValidBlock(x, y, band))
         return kAbsentBlock;
-    switch (m_properties.getInterleavingType()) {
-    case CNitfImagePropertiesIF::eBandSequential:
-        return CNitfImageSource::getTileOffset(m_properties.getTileIndex(x, y, band));
-    case CNitfImagePropertiesIF::eBandInterleavedByBlock: {
-        const unsigned long long offset = CNitfImageSource::getTileOffset(m_properties.getTileIndex(x, y));
-        return offset == kAbsentBlock ? offset : offset + band * m_tileBandBytes;
-    }
-    default:
-        return CNitfImageSource::getTileOffset(m_properties.getTileIndex(x, y));
-    }
+    const unsigned long long offset = entryOffset(blockEntry(x, y, band));
+    if (offset == kAbsentBlock ||
+        m_properties.getInterleavingType() != CNitfImagePropertiesIF::eBandInterleavedByBlock)
+        return offset;
+    return offset + band * m_tileBandBytes;
 }
 
 // ---- starting ---------------------------------------------------------------------------------------------
 
-char* CNitfImageSourceUncompressed::allocateJustified(long long size, const char* what) {
+void CNitfImageSourceUncompressed::checkJustified(long long size, const char* what) const {
     if (size > availableData() + kAllocationSlack)
         NITF_RAISE_FORMAT(
-            "char *__cdecl CNitfImageSourceUncompressed::allocateJustified(__int64,const char *)",
+            "void __cdecl CNitfImageSourceUncompressed::checkJustified(__int64,const char *)",
             "The image's %s (%lld bytes) is larger than the image data in the file (%lld bytes)", what, size,
             availableData());
-    return static_cast<char*>(HCalloc(static_cast<size_t>(size > 0 ? size : 1), 1));
 }
 
-// Checks made before anything is allocated (each raises vexo::Exception):
-// - an IMODE other than S, B, P, R: the layout of the samples is unknown;
-// - block sizes, block rows and block counts that do not fit the interface's ints (checkGeometry);
-// - without block offsets, more blocks than the file holds bytes of image data (the base's readStart);
-// - block offsets that run past the end of the file (readBlockMask);
-// - internal buffers (the block cache of IMODE P and R, the bitmap of a bi-level image) larger than the image
-//   data the file holds, give or take a little (allocateJustified).
-// Offsets that point past the end of the file are not errors: those blocks read as zeros.
-void CNitfImageSourceUncompressed::readStart(FILE* fp, long long dataOffset, long long dataLength) {
-    static const char signature[] =
-        "void __cdecl CNitfImageSourceUncompressed::readStart(" NITF_FILE_SIG ",__int64,__int64)";
-    if (m_properties.getInterleavingType() == CNitfImagePropertiesIF::eInterleavingUnknown) {
-        CNitfProperty* mode = m_subheader ? FindProperty(m_subheader->getProperties(), "IMODE") : nullptr;
-        NITF_RAISE_FORMAT(signature, "Unknown interleaving mode (ISH.IMODE == '%s')",
-                          mode ? mode->toText().c_str() : "");
-    }
+void CNitfImageSourceUncompressed::computeSizes() {
     checkGeometry();
     m_tileBandBytes = m_properties.getTileBandBufferSize();
     m_tileBytes = m_properties.getBandCount() * m_tileBandBytes;
+}
 
+// Checks made before anything is allocated (each raises vexo::Exception):
+// - block sizes, block rows and block counts that do not fit the interface's ints (checkGeometry);
+// - without block offsets, more blocks than the file holds bytes of image data (the base's readStart);
+// - block offsets that run past the end of the file (readBlockMask);
+// - blocks decoded whole (IMODE P and R) and the bitmap of a bi-level image larger than the image data the
+//   file holds, give or take a little.
+// Offsets that point past the end of the file are not errors: those blocks read as zeros. An unknown IMODE
+// leaves the blocks unlocated: they read as absent.
+void CNitfImageSourceUncompressed::readStart(FILE* fp, long long dataOffset, long long dataLength) {
+    computeSizes();
     CNitfImageSource::readStart(fp, dataOffset, dataLength);
     prepareTileOffsets(fp, dataOffset, dataLength, m_blockMask, m_blockMaskCount);
-
-    free(m_blockBuffer);
-    m_blockBuffer = nullptr;
-    m_cacheX = m_cacheY = -1;
-    if (isPixelOrRowInterleaved() && m_properties.getBandCount() >= 2)
-        m_blockBuffer = allocateJustified(m_tileBytes, "block");
+    dropCachedBlock();
+    if (getBlockLayout() != eBlockBands)
+        checkJustified(m_tileBytes, "block");
     if (m_properties.getBpp() == 1)
         buildBitmap(fp);
 }
 
 void CNitfImageSourceUncompressed::writeStart(FILE* fp, long long dataOffset, long long dataLength) {
-    checkGeometry();
-    m_tileBandBytes = m_properties.getTileBandBufferSize();
-    m_tileBytes = m_properties.getBandCount() * m_tileBandBytes;
+    computeSizes();
     CNitfImageSource::writeStart(fp, dataOffset, dataLength);
     prepareTileOffsets(fp, dataOffset, dataLength, m_blockMask, m_blockMaskCount);
 }
@@ -245,8 +168,9 @@ char* CNitfImageSourceUncompressed::ReassemblingBitmap(const char* data, long lo
         NITF_RAISE_FORMAT("char *__cdecl CNitfImageSourceUncompressed::ReassemblingBitmap(void)",
                           "A bi-level image of %lld x %lld pixels is too large", rowBits, rows);
     const long long size = bits / 8 + 1;
+    checkJustified(size, "bitmap");
     // Zero-filled: bits of absent blocks, and of blocks the file does not hold, stay cleared.
-    unsigned char* bitmap = bytes(allocateJustified(size, "bitmap"));
+    unsigned char* bitmap = static_cast<unsigned char*>(HCalloc(static_cast<size_t>(size), 1));
     m_workBufferSize = static_cast<int>(size);
     m_workBufferUsed = static_cast<int>(size);
     for (int y = 0; y < tilesY; ++y) {
@@ -298,135 +222,45 @@ bool CNitfImageSourceUncompressed::readBitmap(char* buffer, int x0, int y0, int 
 
 // ---- block reading ----------------------------------------------------------------------------------------
 
-bool CNitfImageSourceUncompressed::readStored(FILE* fp, unsigned long long offset, char* buffer,
+void CNitfImageSourceUncompressed::readStored(FILE* fp, unsigned long long offset, unsigned char* buffer,
                                               long long size, int storedRow, int rowBytes) {
     const size_t total = static_cast<size_t>(size);
     if (isPacked() || rowBytes == storedRow) {
-        // One band (or block) in one piece: straight into the caller's buffer.
+        // In one piece: straight into the caller's buffer.
         if (offset == kAbsentBlock)
             std::memset(buffer, 0, total);
         else
-            readAt(fp, offset, buffer, total);
-        return true;
+            readAt(fp, offset, reinterpret_cast<char*>(buffer), total);
+        return;
     }
-    if (rowBytes < storedRow || storedRow <= 0)
-        return false;
     const size_t row = static_cast<size_t>(storedRow);
     const size_t rows = total / row;
     if (offset == kAbsentBlock) {
         for (size_t r = 0; r < rows; ++r)
             std::memset(buffer + r * rowBytes, 0, row);
-        return true;
+        return;
     }
     // Rows wider apart than stored: the rows follow one another in the file, so one seek serves them all.
     const bool seeked = DKFSeek64(fp, static_cast<__int64>(offset), SEEK_SET) == 0;
     for (size_t r = 0; r < rows; ++r) {
-        char* out = buffer + r * rowBytes;
+        unsigned char* out = buffer + r * rowBytes;
         if (seeked)
             CDataStream::readZeroFilled(fp, out, row);
         else
             std::memset(out, 0, row);
     }
-    return true;
 }
 
-bool CNitfImageSourceUncompressed::readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x,
-                                                          int y, int band) {
-    FILE* fp = file ? file->getInputStream() : nullptr;
-    if (!fp || !buffer || !m_tileOffsets || !isValidBlock(x, y) || band < 0 ||
-        band >= m_properties.getBandCount())
-        return false;
-    if (isPixelOrRowInterleaved() && m_properties.getBandCount() >= 2) {
-        if (!isPacked() && rowBytes < m_properties.getTileBandWidthBufferSize())
-            return false;
-        if (!loadBlockCache(file, x, y))
-            return false;
-        extractBand(buffer, rowBytes, band);
+bool CNitfImageSourceUncompressed::decodeBlock(FILE* fp, int entry, int band, unsigned char* buffer,
+                                               int rowBytes, bool) {
+    unsigned long long offset = entryOffset(entry);
+    if (band < 0) {
+        readStored(fp, offset, buffer, m_tileBytes, m_properties.getTileWidthBufferSize(), rowBytes);
         return true;
     }
-    return readStored(fp, getTileOffset(x, y, band), buffer, m_tileBandBytes,
-                      m_properties.getTileBandWidthBufferSize(), rowBytes);
-}
-
-bool CNitfImageSourceUncompressed::loadBlockCache(CNitfFile* file, int x, int y) {
-    if (m_cacheX == x && m_cacheY == y)
-        return true;
-    m_cacheX = m_cacheY = -1;
-    if (!m_blockBuffer ||
-        !readTileInterleaved(file, m_blockBuffer, m_properties.getTileWidthBufferSize(), x, y))
-        return false;
-    m_cacheX = x;
-    m_cacheY = y;
-    return true;
-}
-
-// One band out of the cached block. Byte-multiple depths use the interleaving conversions (row-interleaved
-// bands come out as packed rows, whatever `rowBytes` says); packed depths come out as the band's bit stream,
-// laid out as an IMODE B block band would be stored.
-void CNitfImageSourceUncompressed::extractBand(char* buffer, int rowBytes, int band) {
-    const int width = m_properties.getTileWidth(), height = m_properties.getTileHeight();
-    const int bands = m_properties.getBandCount(), bits = m_properties.getBpp();
-    const bool byPixel =
-        m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandInterleavedByPixel;
-    if (!isPacked()) {
-        if (byPixel)
-            deinterleavePixelToBand(buffer, rowBytes, m_blockBuffer, height, width, bands, bits, band);
-        else
-            deinterleaveRowToBand(buffer, rowBytes, m_blockBuffer, height, width, bands, bits, band);
-        return;
-    }
-    unsigned char* out = bytes(buffer);
-    std::memset(out, 0, static_cast<size_t>(m_tileBandBytes));
-    const unsigned char* block = bytes(m_blockBuffer);
-    const uint64_t rowBits = static_cast<uint64_t>(width) * bits;
-    for (uint64_t r = 0; r < static_cast<uint64_t>(height); ++r) {
-        if (!byPixel) {
-            copyBits(out, r * rowBits, block, (r * bands + band) * rowBits, rowBits);
-            continue;
-        }
-        for (uint64_t c = 0; c < static_cast<uint64_t>(width); ++c) {
-            const uint64_t sample = r * width + c;
-            copyBits(out, sample * bits, block, (sample * bands + band) * bits, bits);
-        }
-    }
-}
-
-bool CNitfImageSourceUncompressed::readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x,
-                                                       int y) {
-    FILE* fp = file ? file->getInputStream() : nullptr;
-    if (!fp || !buffer || !m_tileOffsets || !isValidBlock(x, y))
-        return false;
-    const int bands = m_properties.getBandCount();
-    const int storedRow = m_properties.getTileWidthBufferSize();
-    if (isPixelOrRowInterleaved() || bands == 1) {
-        // Stored interleaved already, or a single band: the block in one piece. Absent blocks read as zeros.
-        return readStored(fp, getTileOffset(x, y, 0), buffer, m_tileBytes, storedRow, rowBytes);
-    }
-
-    // Band-interleaved by block or band-sequential: the bands side by side in the block buffer, then
-    // interleaved into the caller's buffer.
-    if (!isPacked() && rowBytes < storedRow)
-        return false;
-    if (!m_blockBuffer)
-        m_blockBuffer = allocateJustified(m_tileBytes, "block");
-    const int bandRow = m_properties.getTileBandWidthBufferSize();
-    for (int band = 0; band < bands; ++band)
-        readStored(fp, getTileOffset(x, y, band), m_blockBuffer + band * m_tileBandBytes, m_tileBandBytes,
-                   bandRow, bandRow);
-    const int width = m_properties.getTileWidth(), height = m_properties.getTileHeight();
-    const int bits = m_properties.getBpp();
-    if (!isPacked()) {
-        deinterleaveBandToPixel(buffer, rowBytes, m_blockBuffer, height, width, bands, bits);
-        return true;
-    }
-    unsigned char* out = bytes(buffer);
-    std::memset(out, 0, static_cast<size_t>(m_tileBytes));
-    const uint64_t samples = static_cast<uint64_t>(width) * height;
-    for (int band = 0; band < bands; ++band) {
-        const unsigned char* plane = bytes(m_blockBuffer + band * m_tileBandBytes);
-        for (uint64_t i = 0; i < samples; ++i)
-            copyBits(out, (i * bands + band) * bits, plane, i * bits, bits);
-    }
+    if (offset != kAbsentBlock)
+        offset += band * m_tileBandBytes;
+    readStored(fp, offset, buffer, m_tileBandBytes, bandRowBytes(), rowBytes);
     return true;
 }
 
