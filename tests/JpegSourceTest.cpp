@@ -124,7 +124,8 @@ Coding lossless(int precision) {
 TEST(JpegMarkerScan, FindsStreamStartsButNotThoseInsideComments) {
     const std::string soi("\xFF\xD8", 2);
     // A comment whose payload holds the start pattern, a stray FF FF D8 (fill bytes before a real marker),
-    // and a comment that straddles the 64 KiB read chunk with the pattern right after the boundary.
+    // and a comment that straddles the 64 KiB read chunk with the pattern right after the boundary: the
+    // comment is skipped only to the chunk's end, so that pattern counts.
     std::string bytes = "xx" + soi + "\xFF\xFE" + std::string("\x00\x08", 2) + "ab" + soi + "cd";
     const size_t second = bytes.size() + 1;
     bytes += "\xFF" + soi;
@@ -133,6 +134,7 @@ TEST(JpegMarkerScan, FindsStreamStartsButNotThoseInsideComments) {
     bytes += "\xFF\xFE" + std::string("\x01\x00", 2); // 254 payload bytes, 8 before the boundary
     std::string payload(254, 'c');
     payload.replace(12, 2, soi);
+    const size_t afterBoundary = bytes.size() + 12;
     bytes += payload;
     const size_t third = bytes.size();
     bytes += soi + "yy"; // and a start pattern split by the chunk after this one
@@ -142,11 +144,11 @@ TEST(JpegMarkerScan, FindsStreamStartsButNotThoseInsideComments) {
 
     auto starts =
         CNitfImageSourceJpeg::findStreamStarts(stream, 0, static_cast<long long>(bytes.size()), 100);
-    EXPECT_EQ(starts, (std::vector<unsigned long long>{2, second, third, 2 * 65536 - 1}));
+    EXPECT_EQ(starts, (std::vector<unsigned long long>{2, second, afterBoundary, third, 2 * 65536 - 1}));
     // The limit stops early; an offset shifts the positions; a shorter range misses the split pattern.
     EXPECT_EQ(CNitfImageSourceJpeg::findStreamStarts(stream, 0, 100000, 2).size(), 2u);
     EXPECT_EQ(CNitfImageSourceJpeg::findStreamStarts(stream, 3, 100000, 100).front(), second);
-    EXPECT_EQ(CNitfImageSourceJpeg::findStreamStarts(stream, 0, 2 * 65536, 100).size(), 3u);
+    EXPECT_EQ(CNitfImageSourceJpeg::findStreamStarts(stream, 0, 2 * 65536, 100).size(), 4u);
 }
 
 TEST(JpegSource, CommentWithStartPatternDoesNotSplitABlock) {

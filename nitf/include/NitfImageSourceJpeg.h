@@ -31,8 +31,9 @@ public:
     void readStart(FILE* fp, long long dataOffset, long long dataLength) override;
 
     // The file positions of the first `limit` start-of-image markers in `length` bytes from `offset`, in
-    // order. Comment segments are skipped (also when they straddle a read chunk), so a marker pattern inside
-    // one does not count; entropy-coded data cannot hold the pattern.
+    // order. Comment segments are skipped, so a marker pattern inside one does not count (entropy-coded data
+    // cannot hold the pattern); a comment that runs past the end of a 64 KiB read chunk is skipped only to
+    // that chunk's end, as streams have always been located.
     static std::vector<unsigned long long> findStreamStarts(FILE* fp, long long offset, long long length,
                                                             size_t limit);
 

@@ -101,6 +101,9 @@ std::vector<unsigned long long> CNitfImageSourceJpeg::findStreamStarts(FILE* fp,
             }
             }
         }
+        // A comment is skipped only to the end of the chunk it starts in; the scan goes on afresh there.
+        if (state == eInComment)
+            state = eSearching;
         consumed += static_cast<long long>(got);
     }
     return starts;
