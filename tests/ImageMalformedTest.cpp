@@ -155,7 +155,6 @@ TEST(ImageMalformed, DataThatTheFileDoesNotHoldReadsAsZeros) {
     bytes.replace(mask + 4, 4, std::string("\x7F\xFF\xFF\x00", 4));
     EXPECT_EQ(readEverything(bytes), "");
     EXPECT_NE(readEverything(bytes.substr(0, mask + 6)).find("block mask"), std::string::npos);
-
 }
 
 TEST(ImageMalformed, AnUnknownInterleavingLeavesEveryBlockAbsent) {

@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "HostError.h"
-#include "ImageExtract.h"
+#include "Canonical.h"
 #include "NitfFileReader.h"
 #include "NitfImagePropertiesIF.h"
 #include "NitfImageSource.h"
@@ -36,14 +36,7 @@ struct OpenImage {
     CNitfImageSourceUncompressed& uncompressed() {
         return dynamic_cast<CNitfImageSourceUncompressed&>(*source);
     }
-    std::string band(int band) {
-        nitfextract::BandReader bands(reader, *source);
-        std::string out;
-        nitfextract::writeCanonical(bands, band, [&](const unsigned char* data, size_t size) {
-            out.append(reinterpret_cast<const char*>(data), size);
-        });
-        return out;
-    }
+    std::string band(int band) { return canonicalBand(reader, *source, band); }
 
     TempFile file;
     CNitfFileReader reader;

@@ -9,7 +9,7 @@
 
 #include "BlockResampler.h"
 #include "HostError.h"
-#include "ImageExtract.h"
+#include "Canonical.h"
 #include "JpegAmplitudeMap.h"
 #include "JpegStreamDecoder.h"
 #include "JpegStreams.h"
@@ -274,17 +274,12 @@ TEST(JpegSource, ExtractWritesTwelveBitSamplesCanonically) {
     image.nppbh = 24;
     image.nppbv = 20;
     JpegFile file(image);
-    nitfextract::BandReader reader(*file.file(), file.source());
-    std::string canonical;
-    nitfextract::writeCanonical(reader, 0, [&](const unsigned char* data, size_t size) {
-        canonical.append(reinterpret_cast<const char*>(data), size);
-    });
+    const std::string canonical = canonicalBand(*file.file(), file.source(), 0);
     Raster cropped{40, 20, 1, {}};
     for (int y = 0; y < 20; ++y)
         for (int x = 0; x < 40; ++x)
             cropped.samples.push_back(whole.at(x, y));
     EXPECT_EQ(canonical, jpegtest::canonical(cropped, 0, 12));
-    EXPECT_EQ(reader.failedBlocks(), 0);
 }
 
 TEST(JpegSource, DctStreamsMatchLibjpeg) {

@@ -131,24 +131,34 @@ public:
                                       int bitsPerPixel, int band);
 
 protected:
-    // ---- what a codec supplies -----------------------------------------------------------------------------
+    // ---- what a codec supplies
+    // -----------------------------------------------------------------------------
 
     // What a decoded block entry holds. The default follows IMODE: bands for "S", "B" and single-band images,
     // pixels for "P", rows for "R".
     virtual eBlockLayout_t getBlockLayout() const;
     // Decodes block entry `entry` of the tile offset table into `buffer`, rows `rowBytes` apart. For the
-    // eBlockBands layout `band` is the band of the entry to decode (always 0 for IMODE S); for the others it is
-    // -1 and every band of the entry is decoded, in the layout's order. `interleaved` is true when the result
-    // is handed out as a whole interleaved block rather than as one band. Returns false when the block is
-    // absent; raises vexo::Exception when it cannot be decoded. `rowBytes` is at least the row size of the
+    // eBlockBands layout `band` is the band of the entry to decode (always 0 for IMODE S); for the others it
+    // is -1 and every band of the entry is decoded, in the layout's order. `interleaved` is true when the
+    // result is handed out as a whole interleaved block rather than as one band. Returns false when the block
+    // is absent; raises vexo::Exception when it cannot be decoded. `rowBytes` is at least the row size of the
     // layout (planes lie tile height x `rowBytes`, or getTileBandBufferSize() for packed depths, apart).
     virtual bool decodeBlock(FILE* fp, int entry, int band, unsigned char* buffer, int rowBytes,
                              bool interleaved) = 0;
+    // Reads rows [firstRow, firstRow + rows) of band `band` of block entry `entry` (the eBlockBands layout)
+    // into `buffer`, rows `rowBytes` apart, without decoding the rest of the block; false when the source
+    // cannot, and the whole block is decoded instead. Sources whose blocks are stored as they are offer it,
+    // so that windows of huge blocks cost only what they read.
+    virtual bool decodeBlockRows(FILE* fp, int entry, int band, int firstRow, int rows, unsigned char* buffer,
+                                 int rowBytes);
+    // Whether decodeBlockRows reads parts of blocks of this image.
+    virtual bool canDecodeBlockRows() const;
     // Called on every band handed out by readTileNonInterleaved, after decoding (and band extraction): the
     // place for amplitude mappings that apply to bands only.
     virtual void finishBand(CNitfFile* file, unsigned char* buffer, int rowBytes);
 
-    // ---- shared mechanics for codecs -----------------------------------------------------------------------
+    // ---- shared mechanics for codecs
+    // -----------------------------------------------------------------------
 
     // Number of entries in the block tables: blocks × bands for IMODE S, blocks for B, P, R, 0 otherwise.
     // Raises vexo::Exception when the count does not fit in an int.
@@ -199,7 +209,8 @@ private:
 
     // One band of block (x, y) into `buffer`, rows `rowBytes` apart (row-interleaved bands packed when
     // `packRows` is set). False when the block is absent.
-    bool readBand(CNitfFile* file, unsigned char* buffer, int rowBytes, int x, int y, int band, bool packRows);
+    bool readBand(CNitfFile* file, unsigned char* buffer, int rowBytes, int x, int y, int band,
+                  bool packRows);
     // Makes the cache hold block (x, y) decoded whole; false when the block is absent.
     bool loadCachedBlock(FILE* fp, int x, int y);
     // Band `band` of the cached block into `buffer`.
@@ -208,6 +219,9 @@ private:
     void interleavePlanes(const unsigned char* planes, unsigned char* buffer, int rowBytes) const;
     void checkRowBytes(int rowBytes, int wanted, const char* signature) const;
     bool decodeCounted(FILE* fp, int entry, int band, unsigned char* buffer, int rowBytes, bool interleaved);
+    // Rows of one band of a block read without decoding the rest, when the source can; see decodeBlockRows.
+    bool readBandRows(CNitfFile* file, unsigned char* buffer, int rowBytes, int x, int y, int band,
+                      int firstRow, int rows);
 
     std::vector<unsigned char> m_cachedBlock; // one whole decoded block, for handing out its bands
     int m_cachedX;

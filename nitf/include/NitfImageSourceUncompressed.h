@@ -31,6 +31,10 @@ protected:
     // what the file does not hold, read as zeros.
     bool decodeBlock(FILE* fp, int entry, int band, unsigned char* buffer, int rowBytes,
                      bool interleaved) override;
+    bool decodeBlockRows(FILE* fp, int entry, int band, int firstRow, int rows, unsigned char* buffer,
+                         int rowBytes) override;
+    // Bands of blocks stored whole-byte sample by sample can be read row by row.
+    bool canDecodeBlockRows() const override;
 
 private:
     // Reads `size` stored bytes at `offset` (absent: zeros) into `buffer`: for byte-multiple depths as rows

@@ -58,6 +58,7 @@
 #include "NitfLabelSource.h"
 #include "NitfLutSource.h"
 #include "NitfProperty.h"
+#include "NitfRegionReader.h"
 #include "NitfSegmentSource.h"
 #include "NitfSymbolSource.h"
 #include "NitfTag.h"

@@ -223,7 +223,8 @@ bool CNitfImageSource::isBlockAbsent(int x, int y, int band) const {
     return !isValidBlock(x, y, band) || entryOffset(blockEntry(x, y, band)) == kAbsentBlock;
 }
 
-void CNitfImageSource::tileOffsetsFromMask(unsigned long long start, const unsigned int* blockMask, int count) {
+void CNitfImageSource::tileOffsetsFromMask(unsigned long long start, const unsigned int* blockMask,
+                                           int count) {
     for (int i = 0; m_tileOffsets && i < m_tileOffsetCount; ++i) {
         const unsigned int offset = i < count ? blockMask[i] : 0xFFFFFFFFu;
         m_tileOffsets[i] = offset == 0xFFFFFFFFu ? kAbsentBlock : start + offset;
@@ -245,9 +246,34 @@ CNitfImageSource::eBlockLayout_t CNitfImageSource::getBlockLayout() const {
 
 void CNitfImageSource::finishBand(CNitfFile*, unsigned char*, int) {}
 
+bool CNitfImageSource::decodeBlockRows(FILE*, int, int, int, int, unsigned char*, int) {
+    return false;
+}
+
+bool CNitfImageSource::canDecodeBlockRows() const {
+    return false;
+}
+
+bool CNitfImageSource::readBandRows(CNitfFile* file, unsigned char* buffer, int rowBytes, int x, int y,
+                                    int band, int firstRow, int rows) {
+    if (!canDecodeBlockRows() || firstRow < 0 || rows <= 0 ||
+        firstRow + rows > m_properties.getTileHeight())
+        return false;
+    checkRowBytes(
+        rowBytes, bandRowBytes(),
+        "bool __cdecl CNitfImageSource::readBandRows(class CNitfFile *,unsigned char *,int,int,int,int,"
+        "int,int)");
+    if (!decodeBlockRows(file->getInputStream(), blockEntry(x, y, band), bandInEntry(band), firstRow, rows,
+                         buffer, rowBytes))
+        return false;
+    ++m_decodeCount;
+    return true;
+}
+
 void CNitfImageSource::checkRowBytes(int rowBytes, int wanted, const char* signature) const {
     if (!isPacked() && rowBytes < wanted)
-        NITF_RAISE_FORMAT(signature, "Rows of %d bytes cannot hold a block row of %d bytes", rowBytes, wanted);
+        NITF_RAISE_FORMAT(signature, "Rows of %d bytes cannot hold a block row of %d bytes", rowBytes,
+                          wanted);
 }
 
 bool CNitfImageSource::decodeCounted(FILE* fp, int entry, int band, unsigned char* buffer, int rowBytes,
@@ -266,9 +292,10 @@ bool CNitfImageSource::readTileNonInterleaved(CNitfFile* file, char* buffer, int
 
 bool CNitfImageSource::readBand(CNitfFile* file, unsigned char* buffer, int rowBytes, int x, int y, int band,
                                 bool packRows) {
-    checkRowBytes(rowBytes, bandRowBytes(),
-                  "bool __cdecl CNitfImageSource::readTileNonInterleaved(class CNitfFile *,char *,int,int,int,"
-                  "int)");
+    checkRowBytes(
+        rowBytes, bandRowBytes(),
+        "bool __cdecl CNitfImageSource::readTileNonInterleaved(class CNitfFile *,char *,int,int,int,"
+        "int)");
     FILE* fp = file->getInputStream();
     if (getBlockLayout() == eBlockBands) {
         if (!decodeCounted(fp, blockEntry(x, y, band), bandInEntry(band), buffer, rowBytes, false))
@@ -350,7 +377,8 @@ void CNitfImageSource::extractCachedBand(unsigned char* buffer, int rowBytes, in
                 return;
             }
             for (int r = 0; r < height; ++r)
-                std::memcpy(buffer + static_cast<size_t>(r) * rowBytes, block + (r * bands + band) * row, row);
+                std::memcpy(buffer + static_cast<size_t>(r) * rowBytes, block + (r * bands + band) * row,
+                            row);
             return;
         default: {
             const unsigned char* plane = block + band * bandPlaneBytes();
@@ -380,15 +408,16 @@ void CNitfImageSource::extractCachedBand(unsigned char* buffer, int rowBytes, in
     }
 }
 
-void CNitfImageSource::interleavePlanes(const unsigned char* planes, unsigned char* buffer, int rowBytes) const {
+void CNitfImageSource::interleavePlanes(const unsigned char* planes, unsigned char* buffer,
+                                        int rowBytes) const {
     const int width = m_properties.getTileWidth(), height = m_properties.getTileHeight();
     const int bands = m_properties.getBandCount();
     const long long plane = bandPlaneBytes();
     if (!isPacked()) {
         const int sampleBits = 8 * (bandRowBytes() / std::max(width, 1));
         deinterleaveBandToPixel(reinterpret_cast<char*>(buffer), rowBytes,
-                                const_cast<char*>(reinterpret_cast<const char*>(planes)), height, width, bands,
-                                sampleBits);
+                                const_cast<char*>(reinterpret_cast<const char*>(planes)), height, width,
+                                bands, sampleBits);
         return;
     }
     const int bits = m_properties.getBpp();

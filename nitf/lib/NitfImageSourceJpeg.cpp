@@ -178,8 +178,7 @@ int CNitfImageSourceJpeg::sampleBytes() const {
 }
 
 CNitfImageSource::eBlockLayout_t CNitfImageSourceJpeg::getBlockLayout() const {
-    const bool bandSequential =
-        m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandSequential;
+    const bool bandSequential = m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandSequential;
     return bandSequential || m_properties.getBandCount() < 2 ? eBlockBands : eBlockPixels;
 }
 

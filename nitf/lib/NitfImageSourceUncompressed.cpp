@@ -264,6 +264,20 @@ bool CNitfImageSourceUncompressed::decodeBlock(FILE* fp, int entry, int band, un
     return true;
 }
 
+bool CNitfImageSourceUncompressed::canDecodeBlockRows() const {
+    return getBlockLayout() == eBlockBands && !isPacked();
+}
+
+bool CNitfImageSourceUncompressed::decodeBlockRows(FILE* fp, int entry, int band, int firstRow, int rows,
+                                                   unsigned char* buffer, int rowBytes) {
+    unsigned long long offset = entryOffset(entry);
+    const long long storedRow = bandRowBytes();
+    if (offset != kAbsentBlock)
+        offset += band * m_tileBandBytes + firstRow * storedRow;
+    readStored(fp, offset, buffer, rows * storedRow, static_cast<int>(storedRow), rowBytes);
+    return true;
+}
+
 // ---- writing ----------------------------------------------------------------------------------------------
 
 bool CNitfImageSourceUncompressed::writeTileNonInterleaved(CNitfFile* file, char* buffer, int x, int y,
