@@ -6,6 +6,7 @@
 
 #include "HostFile.h"
 
+#include <cstring>
 #include <mutex>
 #include <string>
 #include <unordered_map>
@@ -45,6 +46,106 @@ StreamNames& streamNames() {
     return names;
 }
 
+// Streams made over callbacks: their size comes from the callbacks, not from a file descriptor.
+class CallbackSizes {
+public:
+    void add(FILE* fp, const DKStreamCallbacks* callbacks) {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        m_streams[fp] = callbacks;
+    }
+    void remove(FILE* fp) {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        m_streams.erase(fp);
+    }
+    bool find(FILE* fp, __int64& size) {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        auto it = m_streams.find(fp);
+        if (it == m_streams.end())
+            return false;
+        size = it->second->size ? it->second->size(it->second->user) : -1;
+        return true;
+    }
+
+private:
+    std::mutex m_mutex;
+    std::unordered_map<FILE*, const DKStreamCallbacks*> m_streams;
+};
+
+CallbackSizes& callbackSizes() {
+    static CallbackSizes sizes;
+    return sizes;
+}
+
+// The cookie of a callback stream: the callbacks (owned copy) and the position, which the C library's seeks
+// relative to the current position or the end need.
+struct CallbackStream {
+    DKStreamCallbacks callbacks;
+    long long position = 0;
+};
+
+ssize_t callbackRead(void* cookie, char* buffer, size_t size) {
+    CallbackStream& stream = *static_cast<CallbackStream*>(cookie);
+    const long long got = stream.callbacks.read(stream.callbacks.user, buffer, size);
+    if (got > 0)
+        stream.position += got;
+    return got < 0 ? -1 : static_cast<ssize_t>(got);
+}
+
+int callbackSeek(void* cookie, off64_t* offset, int whence) {
+    CallbackStream& stream = *static_cast<CallbackStream*>(cookie);
+    long long base = 0;
+    if (whence == SEEK_CUR) {
+        base = stream.position;
+    } else if (whence == SEEK_END) {
+        base = stream.callbacks.size ? stream.callbacks.size(stream.callbacks.user) : -1;
+        if (base < 0)
+            return -1;
+    }
+    const long long target = base + *offset;
+    if (target < 0 || stream.callbacks.seek(stream.callbacks.user, target) != 0)
+        return -1;
+    stream.position = target;
+    *offset = target;
+    return 0;
+}
+
+int callbackClose(void* cookie) {
+    CallbackStream* stream = static_cast<CallbackStream*>(cookie);
+    if (stream->callbacks.close)
+        stream->callbacks.close(stream->callbacks.user);
+    delete stream;
+    return 0;
+}
+
+// Memory streams are callback streams over a view of the bytes.
+struct MemoryView {
+    const unsigned char* data;
+    size_t size;
+    size_t position;
+};
+
+long long memoryRead(void* user, void* buffer, size_t size) {
+    MemoryView& view = *static_cast<MemoryView*>(user);
+    const size_t left = view.position < view.size ? view.size - view.position : 0;
+    const size_t count = size < left ? size : left;
+    std::memcpy(buffer, view.data + view.position, count);
+    view.position += count;
+    return static_cast<long long>(count);
+}
+
+int memorySeek(void* user, long long offset) {
+    static_cast<MemoryView*>(user)->position = static_cast<size_t>(offset);
+    return 0;
+}
+
+long long memorySize(void* user) {
+    return static_cast<long long>(static_cast<MemoryView*>(user)->size);
+}
+
+void memoryClose(void* user) {
+    delete static_cast<MemoryView*>(user);
+}
+
 // The fopen mode for `flags`, as described at DKOpen; empty when the flags cannot be honoured.
 std::string modeFromFlags(const char* name, int flags) {
     const bool exists = DKCheck(name);
@@ -78,10 +179,37 @@ FILE* DKOpen(const char* name, int flags, const char* access) {
     return fp;
 }
 
+FILE* DKOpenCallbacks(const DKStreamCallbacks* callbacks, const char* name) {
+    if (!callbacks || !callbacks->read || !callbacks->seek)
+        return nullptr;
+    CallbackStream* stream = new CallbackStream{*callbacks, 0};
+    cookie_io_functions_t io = {callbackRead, nullptr, callbackSeek, callbackClose};
+    FILE* fp = fopencookie(stream, "rb", io);
+    if (!fp) {
+        delete stream;
+        return nullptr;
+    }
+    streamNames().add(fp, name ? name : "");
+    callbackSizes().add(fp, &stream->callbacks);
+    return fp;
+}
+
+FILE* DKOpenMemory(const void* data, size_t size, const char* name) {
+    if (!data && size != 0)
+        return nullptr;
+    MemoryView* view = new MemoryView{static_cast<const unsigned char*>(data), size, 0};
+    const DKStreamCallbacks callbacks = {view, memoryRead, memorySeek, memorySize, memoryClose};
+    FILE* fp = DKOpenCallbacks(&callbacks, name);
+    if (!fp)
+        delete view;
+    return fp;
+}
+
 int DKClose(FILE* fp) {
     if (!fp)
         return EOF;
     streamNames().remove(fp);
+    callbackSizes().remove(fp);
     return std::fclose(fp);
 }
 
@@ -114,8 +242,11 @@ __int64 DKFTell(FILE* fp) {
 __int64 DKSize(FILE* fp) {
     if (!fp)
         return -1;
-    // No flush: on a stream being read it would throw away the read-ahead buffer, and readers ask for the size
-    // often. Bytes written but not yet flushed end at or before the stream's position, which is counted.
+    // No flush: on a stream being read it would throw away the read-ahead buffer, and readers ask for the
+    // size often. Bytes written but not yet flushed end at or before the stream's position, which is counted.
+    __int64 supplied = -1;
+    if (callbackSizes().find(fp, supplied))
+        return supplied;
     struct stat info;
     if (fstat(fileno(fp), &info) != 0)
         return -1;

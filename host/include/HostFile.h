@@ -26,6 +26,26 @@ const int DK_MODE_CREATE_BINARY = DK_WRITE | DK_READ | DK_BINARY | DK_CREATE;
 FILE* DKOpen(const char* name, int flags, const char* access);
 int DKClose(FILE* fp);
 
+// A stream the caller supplies: reads at the current position, absolute seeks and the size. The library calls
+// them from the thread that uses the stream only.
+struct DKStreamCallbacks {
+    void* user;
+    // Reads up to `size` bytes into `buffer`; returns how many (0 at the end), or -1 on failure.
+    long long (*read)(void* user, void* buffer, size_t size);
+    // Moves to `offset` bytes from the start; returns 0 on success.
+    int (*seek)(void* user, long long offset);
+    // The stream's size in bytes, or -1 when it cannot be told.
+    long long (*size)(void* user);
+    // Called once when the stream is closed; may be null.
+    void (*close)(void* user);
+};
+
+// A read-only C stream over `size` bytes of memory, which must stay valid until the stream is closed; `name`
+// is what fp2filename reports. Null when `data` is null and `size` is not 0.
+FILE* DKOpenMemory(const void* data, size_t size, const char* name);
+// A read-only C stream over the caller's callbacks (read and seek are required). Null when they are missing.
+FILE* DKOpenCallbacks(const DKStreamCallbacks* callbacks, const char* name);
+
 size_t DKFRead(void* buffer, size_t size, size_t count, FILE* fp);
 size_t DKFWrite(const void* buffer, size_t size, size_t count, FILE* fp);
 

@@ -1,9 +1,14 @@
 // The entry point for reading: opens a file, detects its version, reads its file header, and hands out new
 // objects for the segments asked for by index. Every object a getNew... call returns belongs to the caller.
+//
+// Threads: a reader, and every object it hands out, is used by one thread at a time. Several readers of the
+// same file, each with its own stream, may be used on several threads at once; that is how to decode one
+// image on several threads (each thread its own reader and image source).
 #pragma once
 
 #include <cstdio>
 
+#include "HostFile.h"
 #include "NitfFile.h"
 #include "NitfFileHeader.h"
 
@@ -25,6 +30,11 @@ public:
     // nothing, when the file cannot be opened; raises vexo::Exception for a file of unknown version. A reader
     // keeps the header of the first file it opened.
     FILE* open(const char* fileName, const char* access = "rb");
+    // The same over `size` bytes of memory, which must outlive the reader's use of them.
+    FILE* openMemory(const void* data, size_t size);
+    // The same over a stream the caller supplies (see DKStreamCallbacks in HostFile.h), for instance a
+    // language binding's file object.
+    FILE* openStream(const DKStreamCallbacks& callbacks);
     void close() override;
     bool isOpen() const { return m_open; }
 
@@ -56,6 +66,8 @@ protected:
 
 private:
     CNitfFileHeader* getNewFileHeader();
+    // Makes `fp` the reader's stream (null: nothing changes) and reads the header the first time.
+    FILE* adopt(FILE* fp);
 
     bool m_open;
     FILE* m_fp;

@@ -30,7 +30,18 @@ CNitfFileReader::~CNitfFileReader() {
 }
 
 FILE* CNitfFileReader::open(const char* fileName, const char* access) {
-    FILE* fp = DKOpen(fileName, DK_MODE_READ_BINARY, access);
+    return adopt(DKOpen(fileName, DK_MODE_READ_BINARY, access));
+}
+
+FILE* CNitfFileReader::openMemory(const void* data, size_t size) {
+    return adopt(DKOpenMemory(data, size, "<memory>"));
+}
+
+FILE* CNitfFileReader::openStream(const DKStreamCallbacks& callbacks) {
+    return adopt(DKOpenCallbacks(&callbacks, "<stream>"));
+}
+
+FILE* CNitfFileReader::adopt(FILE* fp) {
     if (!fp)
         return nullptr;
     if (m_open)
