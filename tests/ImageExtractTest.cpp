@@ -76,7 +76,11 @@ TEST(ImageCorpus, UncompressedImagesMatchTheManifest) {
                 EXPECT_NE(verdict, "FAIL") << "band " << band << " decodes to " << digest;
                 report << " " << verdict;
             }
-            EXPECT_EQ(bands.failedBlocks, 0);
+            // Only an image whose data run past the end of the file has blocks that cannot be read whole.
+            const bool cutShort =
+                image.at("data_offset").get<long long>() + image.at("data_length").get<long long>() >
+                file.at("size").get<long long>();
+            EXPECT_EQ(bands.failedBlocks > 0, cutShort) << bands.firstError;
             report << "\n";
         }
     }

@@ -6,6 +6,8 @@
 #include <cstdlib>
 #include <cstring>
 #include <memory>
+#include <mutex>
+#include <set>
 #include <stdexcept>
 #include <string>
 #include <thread>
@@ -145,7 +147,28 @@ Options parseOptions(int argc, char** argv) {
     return options;
 }
 
+// Library warnings on stderr, naming the file, each once (several decoding threads meet the same causes).
+class WarningsOnStderr {
+public:
+    explicit WarningsOnStderr(const std::string& file) {
+        m_previous = vexo::nspio::Warning::setHandler([this, file](const char* message, const char*, int) {
+            std::lock_guard<std::mutex> lock(m_mutex);
+            if (m_seen.insert(message).second)
+                std::fprintf(stderr, "nitf extract: %s: warning: %s\n", file.c_str(), message);
+        });
+    }
+    ~WarningsOnStderr() { vexo::nspio::Warning::setHandler(m_previous); }
+    WarningsOnStderr(const WarningsOnStderr&) = delete;
+    WarningsOnStderr& operator=(const WarningsOnStderr&) = delete;
+
+private:
+    vexo::nspio::Warning::Handler m_previous;
+    std::mutex m_mutex;
+    std::set<std::string> m_seen;
+};
+
 int extract(const Options& options) {
+    WarningsOnStderr warnings(options.file);
     OutputFile out(options.output);
     ProgressBar bar;
     const nitfextract::Progress progress = [&](long long done, long long total) { bar.update(done, total); };
@@ -172,7 +195,7 @@ int extract(const Options& options) {
     }
     if (outcome.failedBlocks > 0) {
         std::fprintf(stderr,
-                     "nitf extract: %s: %d block(s) could not be decoded and are written as zeros: %s\n",
+                     "nitf extract: %s: %d block(s) could not be read whole (zeros stand for what is missing): %s\n",
                      options.file.c_str(), outcome.failedBlocks, outcome.firstError.c_str());
         if (!options.allowPartial) {
             std::fprintf(stderr, "nitf extract: %s: keeping %s anyway; --allow-partial accepts this\n",

@@ -27,6 +27,8 @@
 #pragma once
 
 #include <cstdio>
+#include <set>
+#include <string>
 #include <vector>
 
 #include "HostProjection.h"
@@ -102,6 +104,9 @@ public:
     bool isBlockAbsent(int x, int y, int band) const;
     // How many block entries have been decoded (read from the file) so far.
     long long getDecodeCount() const { return m_decodeCount; }
+    // How many block reads met data the file does not hold (cut short, or a block that should be there and is
+    // not); such blocks read as zeros where their data is missing.
+    long long getIncompleteBlockCount() const { return m_incompleteBlocks; }
 
     int getDisplayLevel();
     // Returns IDLVL as well, like getDisplayLevel: kept for callers that rely on it.
@@ -185,6 +190,13 @@ protected:
     bool isPacked() const;
     // Forgets the cached block (for instance after the stream changed).
     void dropCachedBlock() { m_cachedX = m_cachedY = -1; }
+    // Block entry `entry` should be in the file and is not: it is not absent by the block mask, it is damage.
+    // Reading it raises vexo::Exception.
+    void markMissing(int entry);
+    // A block read met data the file does not hold.
+    void noteIncompleteBlock() { ++m_incompleteBlocks; }
+    // Warns through vexo::nspio::Warning::Warn, naming the image, once per source for each `cause`.
+    void warnOnce(const char* cause, const std::string& message);
 
     CNitfImagePropertiesIF m_properties;
     unsigned long long* m_tileOffsets;
@@ -228,4 +240,7 @@ private:
     int m_cachedY;
     std::vector<unsigned char> m_planes; // scratch for assembling interleaved blocks from their bands
     long long m_decodeCount;
+    long long m_incompleteBlocks = 0;
+    std::vector<bool> m_missing; // entries that should be in the file and are not (empty: none)
+    std::set<std::string> m_warned;
 };

@@ -73,6 +73,7 @@ private:
     std::vector<unsigned char> m_rowBuffer;
     std::vector<unsigned char*> m_rowPointers;
     unsigned long long m_dataEnd;
+    unsigned long long m_streamLength = 0; // of the stream being decoded
     eColour_t m_colour;
     unsigned short m_amplitudeOffset;
     unsigned short m_mappedOffset; // the amplitude offset m_amplitudeMap was built with

@@ -48,6 +48,7 @@ private:
                              int tileHeight, int tilesX, int tilesY, long long rowBits, long long rows);
     void buildBitmap(FILE* fp);
     void computeSizes();
+    void checkDataPresent();
 
     long long m_tileBandBytes; // one band of one block, as stored
     long long m_tileBytes;     // one block, every band

@@ -50,7 +50,7 @@ public:
     // What a read met besides samples.
     struct Result {
         int absentBlocks = 0; // recorded as absent: zeros
-        int failedBlocks = 0; // could not be decoded: zeros
+        int failedBlocks = 0; // could not be decoded, or not wholly in the file: zeros where data are missing
         std::string firstError;
     };
 
@@ -99,6 +99,8 @@ private:
     // Reads only the target's rows of a block, when the source can; false otherwise.
     bool readRows(int blockX, int blockY, int band, const Target& target);
     void convert(const unsigned char* block, const Target& target) const;
+    // Counts a block whose read met data the file does not hold (the source's count grew since `before`).
+    void countIncomplete(long long before, int blockX, int blockY, int band, Result& result) const;
     void convertPacked(const unsigned char* block, const Target& target) const;
     void convertWhole(const unsigned char* block, const Target& target) const;
     void swapInPlace(const Target& target) const;

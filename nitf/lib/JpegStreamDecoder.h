@@ -40,6 +40,10 @@ public:
     // Bytes of one decoded sample: 1 up to 8-bit precision, else 2 (native byte order).
     int sampleBytes() const { return m_cinfo.data_precision <= 8 ? 1 : 2; }
     J_COLOR_SPACE streamColorSpace() const { return m_cinfo.jpeg_color_space; }
+    // Whether the stream's own markers (JFIF, or Adobe with transform 1) say its components are YCbCr.
+    bool markedYCbCr() const {
+        return m_cinfo.saw_JFIF_marker || (m_cinfo.saw_Adobe_marker && m_cinfo.Adobe_transform == 1);
+    }
     // Overrides libjpeg's guess of the stream's colour space and sets the colour space it delivers.
     void setColorSpaces(J_COLOR_SPACE stream, J_COLOR_SPACE output);
 

@@ -251,6 +251,7 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
 
     try {
         source->getImageProperties().setCompressionType(code->type);
+        source->setImageIndex(index); // warnings while the data are located name the image
         CNitfHeaderDataPair* pair = m_header->getImageHeaderDataPair(index);
         __int64 dataOffset = pair->getDataOffset();
         __int64 dataLength = pair->getDataLength();
@@ -261,7 +262,6 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
             dataLength -= maskLength;
         }
         source->readStart(m_fp, dataOffset, dataLength);
-        source->setImageIndex(index);
     } catch (...) {
         delete source;
         throw;

@@ -220,7 +220,26 @@ unsigned long long CNitfImageSource::entryOffset(int entry) const {
 }
 
 bool CNitfImageSource::isBlockAbsent(int x, int y, int band) const {
-    return !isValidBlock(x, y, band) || entryOffset(blockEntry(x, y, band)) == kAbsentBlock;
+    if (!isValidBlock(x, y, band))
+        return true;
+    const int entry = blockEntry(x, y, band);
+    const bool missing = entry >= 0 && static_cast<size_t>(entry) < m_missing.size() && m_missing[entry];
+    return !missing && entryOffset(entry) == kAbsentBlock;
+}
+
+void CNitfImageSource::markMissing(int entry) {
+    if (entry < 0 || entry >= m_tileOffsetCount)
+        return;
+    if (m_missing.empty())
+        m_missing.assign(static_cast<size_t>(m_tileOffsetCount), false);
+    m_missing[entry] = true;
+}
+
+void CNitfImageSource::warnOnce(const char* cause, const std::string& message) {
+    if (!m_warned.insert(cause).second)
+        return;
+    const std::string text = "Image " + std::to_string(m_imageIndex) + ": " + message;
+    vexo::nspio::Warning::Warn(text.c_str(), kSourceFile, __LINE__);
 }
 
 void CNitfImageSource::tileOffsetsFromMask(unsigned long long start, const unsigned int* blockMask,
@@ -256,8 +275,7 @@ bool CNitfImageSource::canDecodeBlockRows() const {
 
 bool CNitfImageSource::readBandRows(CNitfFile* file, unsigned char* buffer, int rowBytes, int x, int y,
                                     int band, int firstRow, int rows) {
-    if (!canDecodeBlockRows() || firstRow < 0 || rows <= 0 ||
-        firstRow + rows > m_properties.getTileHeight())
+    if (!canDecodeBlockRows() || firstRow < 0 || rows <= 0 || firstRow + rows > m_properties.getTileHeight())
         return false;
     checkRowBytes(
         rowBytes, bandRowBytes(),
@@ -278,6 +296,12 @@ void CNitfImageSource::checkRowBytes(int rowBytes, int wanted, const char* signa
 
 bool CNitfImageSource::decodeCounted(FILE* fp, int entry, int band, unsigned char* buffer, int rowBytes,
                                      bool interleaved) {
+    if (entry >= 0 && static_cast<size_t>(entry) < m_missing.size() && m_missing[entry]) {
+        ++m_incompleteBlocks;
+        NITF_RAISE_FORMAT("bool __cdecl CNitfImageSource::decodeBlock(" NITF_FILE_SIG
+                          ",int,int,unsigned char *,int,bool)",
+                          "Block entry %d of the image is not in the file", entry);
+    }
     ++m_decodeCount;
     return decodeBlock(fp, entry, band, buffer, rowBytes, interleaved);
 }

@@ -124,6 +124,19 @@ void CNitfImageSourceJpeg::prepareTileOffsets(FILE* fp, long long dataOffset, lo
         findStreamStarts(fp, dataOffset, dataLength, static_cast<size_t>(entries));
     for (int i = 0; i < entries; ++i)
         m_tileOffsets[i] = static_cast<size_t>(i) < starts.size() ? starts[i] : kAbsentBlock;
+    if (starts.size() == static_cast<size_t>(entries))
+        return;
+    // Fewer streams than blocks: the data are cut short or damaged. Far fewer comes from damaged geometry.
+    if (2 * starts.size() < static_cast<size_t>(entries))
+        NITF_RAISE_FORMAT("void __cdecl CNitfImageSourceJpeg::prepareTileOffsets(" NITF_FILE_SIG
+                          ",__int64,__int64,unsigned int *,int)",
+                          "Only %d of the image's %d JPEG streams are in its data",
+                          static_cast<int>(starts.size()), entries);
+    for (int i = static_cast<int>(starts.size()); i < entries; ++i)
+        markMissing(i);
+    warnOnce("missing streams",
+             "only " + std::to_string(starts.size()) + " of the " + std::to_string(entries) +
+                 " JPEG streams its blocks need are in the file; the other blocks cannot be read");
 }
 
 unsigned long long CNitfImageSourceJpeg::streamLength(unsigned long long offset) const {
@@ -189,7 +202,11 @@ bool CNitfImageSourceJpeg::decodeBlock(FILE* fp, int entry, int, unsigned char* 
         m_properties.getTileHeight() <= 0)
         return false;
     const int components = getBlockLayout() == eBlockPixels ? m_properties.getBandCount() : 1;
-    m_decoder->readHeader(fp, offset, streamLength(offset));
+    m_streamLength = streamLength(offset);
+    m_decoder->readHeader(fp, offset, m_streamLength);
+    if (m_colour == eColourRgb && m_decoder->components() == 3 && m_decoder->markedYCbCr())
+        warnOnce("colour", "IREP says RGB but its JPEG streams are marked YCbCr (JFIF or Adobe marker); the "
+                           "samples are delivered as coded, by IREP, without colour conversion");
     if (m_decoder->sawAmplitudeMarker()) {
         m_hasNitfApp6 = true;
         m_amplitudeOffset = m_decoder->amplitudeOffset();
@@ -255,6 +272,14 @@ void CNitfImageSourceJpeg::checkStream(int rowBytes, int components) const {
     const long long width = m_properties.getTileWidth();
     const long long height = m_properties.getTileHeight();
     const long long streamArea = static_cast<long long>(m_decoder->width()) * m_decoder->height();
+    // Every 8 x 8 unit of every component costs the entropy coder at least a few bits, so no stream decodes
+    // to much more than 256 times its own size: more is a damaged header, not a picture.
+    const unsigned long long decoded =
+        static_cast<unsigned long long>(streamArea) * m_decoder->components() * m_decoder->sampleBytes();
+    if (decoded > 256 * m_streamLength + (1u << 20))
+        NITF_RAISE_FORMAT(kDecodeSignature,
+                          "A JPEG stream of %llu bytes cannot code %d x %d pixels of %d components",
+                          m_streamLength, m_decoder->width(), m_decoder->height(), m_decoder->components());
     if (streamArea > kLargestStreamToBlock * width * height)
         NITF_RAISE_FORMAT(kDecodeSignature,
                           "A JPEG stream of %d x %d pixels cannot belong to a block of %lld x %lld",

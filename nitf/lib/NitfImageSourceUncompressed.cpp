@@ -22,10 +22,11 @@ namespace {
 const long long kAllocationSlack = 1 << 20;
 
 // Reads `size` bytes at `offset`; whatever the file does not hold reads as zeros.
-void readAt(FILE* fp, unsigned long long offset, char* buffer, size_t size) {
+// Returns the bytes the file held.
+size_t readAt(FILE* fp, unsigned long long offset, char* buffer, size_t size) {
     __int64 position =
         offset <= static_cast<unsigned long long>(LLONG_MAX) ? static_cast<__int64>(offset) : -1;
-    CDataStream::readZeroFilledAt(fp, position, buffer, size);
+    return CDataStream::readZeroFilledAt(fp, position, buffer, size);
 }
 
 using packedbits::bytes;
@@ -114,8 +115,40 @@ void CNitfImageSourceUncompressed::readStart(FILE* fp, long long dataOffset, lon
     dropCachedBlock();
     if (getBlockLayout() != eBlockBands)
         checkJustified(m_tileBytes, "block");
+    checkJustified(m_tileBandBytes, "block");
+    checkDataPresent();
     if (m_properties.getBpp() == 1)
         buildBitmap(fp);
+}
+
+// The bytes the stored blocks reach, against what the file holds: a little missing is read as zeros with a
+// warning; far more missing than present comes from damaged geometry, and would only extract zeros.
+void CNitfImageSourceUncompressed::checkDataPresent() {
+    const unsigned long long fileEnd = static_cast<unsigned long long>(m_dataOffset + availableData());
+    const long long entryBytes =
+        getBlockLayout() == eBlockBands &&
+                m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandSequential
+            ? m_tileBandBytes
+            : m_tileBytes;
+    unsigned long long needed = 0, missing = 0;
+    for (int i = 0; i < m_tileOffsetCount; ++i) {
+        const unsigned long long offset = m_tileOffsets[i];
+        if (offset == kAbsentBlock)
+            continue;
+        const unsigned long long end = offset + static_cast<unsigned long long>(entryBytes);
+        needed += static_cast<unsigned long long>(entryBytes);
+        if (end > fileEnd)
+            missing += end - std::max(offset, fileEnd);
+    }
+    if (missing == 0)
+        return;
+    const unsigned long long present = needed - missing;
+    if (missing > 2 * present + kAllocationSlack)
+        NITF_RAISE_FORMAT("void __cdecl CNitfImageSourceUncompressed::checkDataPresent(void)",
+                          "The image's blocks need %llu bytes of data but the file holds only %llu of them",
+                          needed, present);
+    warnOnce("short data", "the file holds " + std::to_string(present) + " of the " + std::to_string(needed) +
+                               " bytes its blocks need; what is missing reads as zeros");
 }
 
 void CNitfImageSourceUncompressed::writeStart(FILE* fp, long long dataOffset, long long dataLength) {
@@ -229,8 +262,8 @@ void CNitfImageSourceUncompressed::readStored(FILE* fp, unsigned long long offse
         // In one piece: straight into the caller's buffer.
         if (offset == kAbsentBlock)
             std::memset(buffer, 0, total);
-        else
-            readAt(fp, offset, reinterpret_cast<char*>(buffer), total);
+        else if (readAt(fp, offset, reinterpret_cast<char*>(buffer), total) < total)
+            noteIncompleteBlock();
         return;
     }
     const size_t row = static_cast<size_t>(storedRow);
@@ -242,13 +275,16 @@ void CNitfImageSourceUncompressed::readStored(FILE* fp, unsigned long long offse
     }
     // Rows wider apart than stored: the rows follow one another in the file, so one seek serves them all.
     const bool seeked = DKFSeek64(fp, static_cast<__int64>(offset), SEEK_SET) == 0;
+    size_t got = 0;
     for (size_t r = 0; r < rows; ++r) {
         unsigned char* out = buffer + r * rowBytes;
         if (seeked)
-            CDataStream::readZeroFilled(fp, out, row);
+            got += CDataStream::readZeroFilled(fp, out, row);
         else
             std::memset(out, 0, row);
     }
+    if (got < rows * row)
+        noteIncompleteBlock();
 }
 
 bool CNitfImageSourceUncompressed::decodeBlock(FILE* fp, int entry, int band, unsigned char* buffer,

@@ -227,9 +227,12 @@ void CNitfRegionReader::readBlockBand(int blockX, int blockY, int band, const Ta
     const bool direct = wholeBlock && !m_packed && m_deliveredBytes == m_sampleBytes &&
                         target.pixelStride == static_cast<size_t>(m_sampleBytes) &&
                         target.rowStride <= static_cast<size_t>(INT32_MAX);
+    const long long incomplete = m_source->getIncompleteBlockCount();
     try {
-        if (target.height < m_blockHeight && readRows(blockX, blockY, band, target))
+        if (target.height < m_blockHeight && readRows(blockX, blockY, band, target)) {
+            countIncomplete(incomplete, blockX, blockY, band, result);
             return;
+        }
         bool read;
         if (direct) {
             read = m_source->readBand(m_file, target.out, static_cast<int>(target.rowStride), blockX, blockY,
@@ -248,11 +251,21 @@ void CNitfRegionReader::readBlockBand(int blockX, int blockY, int band, const Ta
             zero(target, m_sampleBytes);
             ++result.absentBlocks;
         }
+        countIncomplete(incomplete, blockX, blockY, band, result);
     } catch (const vexo::Exception& e) {
         zero(target, m_sampleBytes);
         if (result.failedBlocks++ == 0)
             result.firstError = e.what();
     }
+}
+
+void CNitfRegionReader::countIncomplete(long long before, int blockX, int blockY, int band,
+                                        Result& result) const {
+    if (m_source->getIncompleteBlockCount() == before)
+        return;
+    if (result.failedBlocks++ == 0)
+        result.firstError = "block (" + std::to_string(blockX) + ", " + std::to_string(blockY) +
+                            ") of band " + std::to_string(band) + " runs past the end of the file";
 }
 
 bool CNitfRegionReader::readRows(int blockX, int blockY, int band, const Target& target) {
