@@ -11,6 +11,7 @@
 #include <string>
 #include <unordered_map>
 
+#include <stdio_ext.h>
 #include <sys/stat.h>
 #include <sys/types.h>
 
@@ -242,16 +243,19 @@ __int64 DKFTell(FILE* fp) {
 __int64 DKSize(FILE* fp) {
     if (!fp)
         return -1;
-    // No flush: on a stream being read it would throw away the read-ahead buffer, and readers ask for the
-    // size often. Bytes written but not yet flushed end at or before the stream's position, which is counted.
     __int64 supplied = -1;
     if (callbackSizes().find(fp, supplied))
         return supplied;
     struct stat info;
     if (fstat(fileno(fp), &info) != 0)
         return -1;
-    __int64 position = ftello(fp);
-    return position > info.st_size ? static_cast<__int64>(position) : static_cast<__int64>(info.st_size);
+    // A stream being read has the size the file has: a seek past the end must not make it larger. A stream
+    // being written may hold bytes not yet flushed (no flush here: on a stream also being read it would throw
+    // the read-ahead away); they end at or before its position.
+    if (!__fwritable(fp))
+        return static_cast<__int64>(info.st_size);
+    const __int64 position = ftello(fp);
+    return position > info.st_size ? position : static_cast<__int64>(info.st_size);
 }
 
 bool DKCheck(const char* name) {

@@ -21,6 +21,7 @@
 #include "HostConfig.h"
 #include "HostError.h"
 #include "HostFile.h"
+#include "TestFiles.h"
 #include "HostMemory.h"
 #include "HostProjection.h"
 
@@ -464,4 +465,19 @@ TEST(HostProjection, GeoreferenceFromCorners) {
     const double broken[4] = {0, NAN, 0, 0};
     EXPECT_EQ(ProjSetGeoreferenceFromCorners(&info, broken, y, 10, 10), -1);
     EXPECT_EQ(ProjSetGeoreferenceFromCorners(&info, x, y, 0, 10), -1);
+}
+
+TEST(HostFile, SizeOfAReadStreamDoesNotGrowBySeeking) {
+    TempFile file(std::string(100, 'x'));
+    FILE* fp = DKOpen(file.path().c_str(), DK_MODE_READ_BINARY, nullptr);
+    ASSERT_TRUE(fp);
+    ASSERT_EQ(DKFSeek64(fp, 1000000, SEEK_SET), 0);
+    EXPECT_EQ(DKSize(fp), 100) << "a length that seeks past the end does not make the file longer";
+    DKClose(fp);
+
+    FILE* out = DKOpen(file.path().c_str(), DK_MODE_CREATE_BINARY, nullptr);
+    ASSERT_TRUE(out);
+    DKFWrite("abc", 1, 3, out);
+    EXPECT_EQ(DKSize(out), 3) << "bytes written and not yet flushed count";
+    DKClose(out);
 }
