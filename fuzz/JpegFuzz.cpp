@@ -8,7 +8,6 @@
 #include <cstdlib>
 #include <memory>
 #include <string>
-#include <unistd.h>
 #include <vector>
 
 #include "HostError.h"
@@ -17,18 +16,6 @@
 #include "NitfSampleWriter.h"
 
 namespace {
-
-const std::string& scratchPath() {
-    static const std::string path = [] {
-        const char* dir = std::getenv("TMPDIR");
-        std::string pattern = std::string(dir && *dir ? dir : "/tmp") + "/nitf-jpegfuzz-XXXXXX";
-        int fd = mkstemp(&pattern[0]);
-        if (fd >= 0)
-            close(fd);
-        return pattern;
-    }();
-    return path;
-}
 
 // The image the shape byte describes, with the rest of the input as its block data: one stream for an
 // unmasked image (the reader finds the blocks by scanning), split in two for a masked 2 x 1 image.
@@ -80,13 +67,14 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
         return 0;
     nitfsample::File file;
     file.images.push_back(imageFor(data[0], std::string(reinterpret_cast<const char*>(data) + 1, size - 1)));
+    std::string bytes;
     try {
-        nitfsample::write(file, scratchPath());
+        bytes = nitfsample::build(file);
     } catch (const std::exception&) {
         return 0; // a shape the writer cannot lay out
     }
     CNitfFileReader reader;
-    if (!reader.open(scratchPath().c_str()))
+    if (!reader.openMemory(bytes.data(), bytes.size()))
         return 0;
     try {
         readEveryBlock(reader);

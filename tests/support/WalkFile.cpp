@@ -1,16 +1,69 @@
 #include "WalkFile.h"
 
+#include <algorithm>
 #include <memory>
+#include <vector>
 
 #include "HostError.h"
 #include "NitfDataExtensionSource.h"
 #include "NitfFileReader.h"
 #include "NitfImageSubheader.h"
+#include "NitfImageSource.h"
 #include "NitfLabelSource.h"
+#include "NitfLutSource.h"
+#include "NitfRegionReader.h"
 #include "NitfSymbolSource.h"
 #include "NitfTextSource.h"
 
 namespace {
+
+// Buffers beyond this are skipped: a caller would not allocate them for a file this small.
+const long long kLargestBuffer = 64LL << 20;
+// Enough block reads to reach every code path without making a single input slow.
+const int kBlockReads = 4096;
+
+void readImage(CNitfFileReader& reader, int index) {
+    std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(index));
+    const CNitfImagePropertiesIF& p = source->getImageProperties();
+    const long long height = std::max(p.getTileHeight(), 0);
+    const long long bandSize =
+        std::max<long long>(p.getTileBandBufferSize(), height * std::max(p.getTileBandWidthBufferSize(), 0));
+    const long long blockSize =
+        std::max<long long>(p.getTileBufferSize(), height * std::max(p.getTileWidthBufferSize(), 0));
+    if (bandSize <= 0 || blockSize <= 0 || blockSize > kLargestBuffer)
+        return;
+    std::vector<char> buffer(static_cast<size_t>(blockSize));
+    int reads = 0;
+    for (int band = 0; band < p.getBandCount() && reads < kBlockReads; ++band)
+        for (int y = 0; y < p.getTileCountY() && reads < kBlockReads; ++y)
+            for (int x = 0; x < p.getTileCountX() && reads < kBlockReads; ++x, ++reads)
+                source->readTileNonInterleaved(&reader, buffer.data(), band, x, y);
+    source->readTileInterleaved(&reader, buffer.data(), 0, 0);
+    source->readTileInterleaved(&reader, buffer.data(), p.getTileCountX() - 1, p.getTileCountY() - 1);
+
+    // A bi-level image's first rows, sampled down by two.
+    if (p.getBpp() == 1) {
+        const int width = std::min(p.getImageActualWidth(), 4096);
+        const int rows = std::min(p.getImageActualHeight(), 64);
+        std::vector<char> bits(static_cast<size_t>(std::max(rows, 1)) * ((std::max(width, 0) + 7) / 8) + 1);
+        source->readBitmap(bits.data(), 0, 0, width, rows, (width + 7) / 8 * 8, rows / 2);
+    }
+    // The region reader over a window of every band, both layouts.
+    CNitfRegionReader region(&reader, source.get());
+    const int width = std::min(region.getWidth(), 512), rows = std::min(region.getHeight(), 64);
+    if (region.getBufferSize(width, rows, region.getBandCount()) <= static_cast<size_t>(kLargestBuffer)) {
+        std::vector<unsigned char> samples(region.getBufferSize(width, rows, region.getBandCount()));
+        region.read(region.getWidth() - width, 0, width, rows, {}, samples.data());
+        region.setBigEndian(true);
+        region.read(0, region.getHeight() - rows, width, rows, {}, samples.data(),
+                    CNitfRegionReader::ePixelInterleaved);
+    }
+    for (int i = 0; i < source->getLutCount(); ++i) {
+        CNitfLutSource* lut = source->getLutSource(i);
+        std::vector<char> entries(static_cast<size_t>(std::max(lut->getSize(), 0)) + 1);
+        lut->readInterleaved(&reader, entries.data(), lut->getSize());
+    }
+}
 
 void touchTags(std::list<CNitfTag*>& tags) {
     for (CNitfTag* tag : tags)
@@ -52,16 +105,34 @@ void walk(CNitfFileReader& reader) {
         walkSegment(reader.getNewTextSource(i), reader);
 }
 
-} // namespace
-
-void walkFile(const std::string& path, std::string* refusal) {
+template <typename Open> void walkOpened(Open open, std::string* refusal) {
     try {
         CNitfFileReader reader;
-        if (!reader.open(path.c_str()))
+        if (!open(reader))
             return;
         walk(reader);
     } catch (const vexo::Exception& e) {
         if (refusal)
             *refusal = e.what();
+    }
+}
+
+} // namespace
+
+void walkFile(const std::string& path, std::string* refusal) {
+    walkOpened([&](CNitfFileReader& reader) { return reader.open(path.c_str()) != nullptr; }, refusal);
+}
+
+void walkBytes(const void* data, size_t size, std::string* refusal) {
+    walkOpened([&](CNitfFileReader& reader) { return reader.openMemory(data, size) != nullptr; }, refusal);
+}
+
+void readEveryImage(CNitfFileReader& reader) {
+    for (int index = 0; index < std::min(reader.getImageCount(), 32); ++index) {
+        try {
+            readImage(reader, index);
+        } catch (const vexo::Exception&) {
+            // refused: fine
+        }
     }
 }

@@ -2,8 +2,17 @@
 // sub-header, every segment's data, every TRE entry. Used by the robustness tests and the fuzz targets.
 #pragma once
 
+#include <cstddef>
 #include <string>
 
-// Returns normally when the file was read or refused with vexo::Exception (the message goes to `refusal`, when
-// given); anything else (a crash, another exception type) is the caller's failure to report.
+// Returns normally when the file was read or refused with vexo::Exception (the message goes to `refusal`,
+// when given); anything else (a crash, another exception type) is the caller's failure to report.
 void walkFile(const std::string& path, std::string* refusal = nullptr);
+class CNitfFileReader;
+
+// Every image of an open file through its image source: every block of every band read into buffers sized
+// by the image's properties (as many as stay quick), a window through the region reader, the look-up tables.
+// Refusals with vexo::Exception are taken as they come.
+void readEveryImage(CNitfFileReader& reader);
+// The same for a file held in memory.
+void walkBytes(const void* data, size_t size, std::string* refusal = nullptr);
