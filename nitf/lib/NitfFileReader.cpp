@@ -217,7 +217,8 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
     CNitfImageSource* source = nullptr;
     try {
         if (!code)
-            NITF_RAISE_FORMAT(kImageSourceSignature, "Compression not supported (ISH.IC == %s)", ic.c_str());
+            NITF_RAISE_FORMAT(kImageSourceSignature, "Compression not supported (ISH.IC == %s)",
+                              nitf_detail::printable(ic).c_str());
         switch (code->type) {
         case CNitfImagePropertiesIF::eCompressionUncompressed:
             source = new CNitfImageSourceUncompressed(subheader, nullptr);
@@ -241,7 +242,8 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
         default:
             // Decoders that have not landed yet: bi-level, VQ and JPEG 2000.
             NITF_RAISE_FORMAT(kImageSourceSignature,
-                              "Compression not yet supported by this build (ISH.IC == %s)", ic.c_str());
+                              "Compression not yet supported by this build (ISH.IC == %s)",
+                              nitf_detail::printable(ic).c_str());
         }
     } catch (...) {
         if (!source)

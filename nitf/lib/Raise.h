@@ -43,4 +43,21 @@ template <typename Int> inline Int truncateTo(double value, Int lowest, Int high
     return static_cast<Int>(value);
 }
 
+// A field's text as it may stand in a message: bytes that are not printable ASCII are written as \xHH, so
+// that a damaged field cannot put control bytes on a terminal ("ISH.IC == \x0b\x0b").
+inline std::string printable(const std::string& text) {
+    static const char digits[] = "0123456789abcdef";
+    std::string out;
+    for (unsigned char c : text) {
+        if (c >= 0x20 && c < 0x7F && c != '\\') {
+            out += static_cast<char>(c);
+        } else {
+            out += "\\x";
+            out += digits[c >> 4];
+            out += digits[c & 15];
+        }
+    }
+    return out;
+}
+
 } // namespace nitf_detail

@@ -1,0 +1,187 @@
+// Damaged input, by cause: each case either reads what is there and says so (a warning, blocks counted as not
+// read) or is refused with a clear message; none passes silently.
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "HostError.h"
+#include "JpegStreams.h"
+#include "NitfImageSource.h"
+#include "NitfRegionReader.h"
+#include "NitfTestFile.h"
+#include "TestFiles.h"
+
+namespace {
+
+// Collects the warnings given while it lives.
+class Warnings {
+public:
+    Warnings() {
+        m_previous = vexo::nspio::Warning::setHandler(
+            [this](const char* message, const char*, int) { m_messages.push_back(message); });
+    }
+    ~Warnings() { vexo::nspio::Warning::setHandler(m_previous); }
+    const std::vector<std::string>& messages() const { return m_messages; }
+    int count(const std::string& part) const {
+        int n = 0;
+        for (const std::string& message : m_messages)
+            n += message.find(part) != std::string::npos;
+        return n;
+    }
+
+private:
+    vexo::nspio::Warning::Handler m_previous;
+    std::vector<std::string> m_messages;
+};
+
+std::string fileOf(const nitfsample::Image& image) {
+    nitfsample::File file;
+    file.images = {image};
+    return nitfsample::build(file);
+}
+
+// Reads the whole image through the region reader; the exception's message when the source is refused.
+struct WholeRead {
+    std::string refusal;
+    CNitfRegionReader::Result result;
+};
+
+WholeRead readWhole(const std::string& bytes) {
+    WholeRead read;
+    CNitfFileReader reader;
+    if (!reader.openMemory(bytes.data(), bytes.size()))
+        return read;
+    try {
+        std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(0));
+        CNitfRegionReader region(&reader, source.get());
+        std::vector<unsigned char> out(region.getBufferSize(region.getWidth(), region.getHeight(), 1));
+        for (int band = 0; band < region.getBandCount(); ++band) {
+            const CNitfRegionReader::Result r =
+                region.read(0, 0, region.getWidth(), region.getHeight(), {band}, out.data());
+            read.result.failedBlocks += r.failedBlocks;
+            read.result.absentBlocks += r.absentBlocks;
+            if (read.result.firstError.empty())
+                read.result.firstError = r.firstError;
+        }
+    } catch (const vexo::Exception& e) {
+        read.refusal = e.what();
+    }
+    return read;
+}
+
+nitfsample::Image jpegImage(int blocks, const std::string& irep = "MONO", int components = 1) {
+    nitfsample::Image image;
+    image.ic = "C3";
+    image.comrat = "00.0";
+    image.cols = 16 * blocks;
+    image.rows = 16;
+    image.nppbh = image.nppbv = 16;
+    image.bands = components;
+    image.imode = components > 1 ? 'P' : 'B';
+    image.irep = irep;
+    jpegtest::Coding coding;
+    for (int i = 0; i < blocks; ++i)
+        image.blockData.push_back(jpegtest::encode(jpegtest::pattern(16, 16, components, 8, i), coding));
+    return image;
+}
+
+} // namespace
+
+TEST(DamagedImageData, ShortUncompressedDataWarnsOnceAndCountsItsBlocks) {
+    nitfsample::Image image;
+    image.cols = image.rows = 32;
+    image.nppbh = image.nppbv = 16;
+    image.bands = 2;
+    const std::string bytes = fileOf(image);
+    Warnings warnings;
+    // Cut inside the last band of the last block.
+    const WholeRead read = readWhole(bytes.substr(0, bytes.size() - 100));
+    EXPECT_EQ(read.refusal, "");
+    EXPECT_EQ(read.result.failedBlocks, 1);
+    EXPECT_NE(read.result.firstError.find("past the end of the file"), std::string::npos);
+    EXPECT_EQ(warnings.count("of the 2048 bytes its blocks need"), 1) << "once per image, not per block";
+
+    // Far less data than the blocks need: refused rather than extracted as zeros.
+    nitfsample::Image huge = image;
+    huge.fields = {{"NROWS", "00005120"}, {"NCOLS", "00005120"}, {"NBPR", "0010"},
+                   {"NBPC", "0010"},      {"NPPBH", "0512"},     {"NPPBV", "0512"}};
+    const std::string refusal = readWhole(fileOf(huge)).refusal;
+    EXPECT_NE(refusal.find("the file holds only 2048"), std::string::npos) << refusal;
+}
+
+TEST(DamagedImageData, MissingAndImpossibleJpegStreams) {
+    // Four blocks, the last stream lost: three read, one fails, one warning.
+    nitfsample::Image image = jpegImage(4);
+    image.blockData.pop_back();
+    {
+        Warnings warnings;
+        const WholeRead read = readWhole(fileOf(image));
+        EXPECT_EQ(read.refusal, "");
+        EXPECT_EQ(read.result.failedBlocks, 1);
+        EXPECT_EQ(read.result.absentBlocks, 0) << "a lost stream is damage, not an absent block";
+        EXPECT_EQ(warnings.count("3 of the 4 JPEG streams"), 1);
+    }
+    // Most streams lost: the geometry cannot be right.
+    image.blockData.resize(1);
+    EXPECT_NE(readWhole(fileOf(image)).refusal.find("Only 1 of the image's 4 JPEG streams"),
+              std::string::npos);
+
+    // A stream whose header claims far more pixels than its bytes can code fails as a block.
+    nitfsample::Image claim = jpegImage(1);
+    std::string& stream = claim.blockData[0];
+    const size_t frame = stream.find(std::string("\xFF\xC0", 2));
+    ASSERT_NE(frame, std::string::npos);
+    stream[frame + 5] = '\x7F'; // height 0x7F10
+    stream[frame + 7] = '\x7F'; // width 0x7F10
+    const WholeRead read = readWhole(fileOf(claim));
+    EXPECT_EQ(read.result.failedBlocks, 1);
+    EXPECT_NE(read.result.firstError.find("cannot code"), std::string::npos) << read.result.firstError;
+}
+
+TEST(DamagedImageData, YCbCrMarkedStreamsUnderRgbWarnOnce) {
+    // libjpeg writes a JFIF marker on YCbCr streams: IREP RGB says otherwise.
+    Warnings warnings;
+    const WholeRead read = readWhole(fileOf(jpegImage(2, "RGB", 3)));
+    EXPECT_EQ(read.result.failedBlocks, 0);
+    EXPECT_EQ(warnings.count("marked YCbCr"), 1);
+}
+
+TEST(DamagedMessages, FieldValuesInMessagesAreEscaped) {
+    nitfsample::Image image;
+    image.ic = "NC";
+    image.fields = {{"IC", "\x0b\x0b"}};
+    const std::string bytes = fileOf(image);
+    CNitfFileReader reader;
+    ASSERT_TRUE(reader.openMemory(bytes.data(), bytes.size()));
+    try {
+        delete reader.getNewImageSource(0);
+        FAIL() << "an unknown compression is refused";
+    } catch (const vexo::Exception& e) {
+        EXPECT_STREQ(e.what(), "Compression not supported (ISH.IC == \\x0b\\x0b)");
+    }
+}
+
+TEST(DamagedExtract, ExitsNonZeroOnUnreadBlocksUnlessPartialIsAllowed) {
+    nitfsample::Image image;
+    image.cols = image.rows = 32;
+    const std::string bytes = fileOf(image);
+    TempFile input(bytes.substr(0, bytes.size() - 10));
+    TempFile output("", ".raw");
+    auto run = [&](const std::string& options) {
+        const std::string command = std::string(NITF_TOOL_PATH) + " extract " + input.path() + " -f raw -o " +
+                                    output.path() + " " + options + " 2>" + output.path() + ".err";
+        const int status = std::system(command.c_str());
+        return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    };
+    EXPECT_EQ(run(""), 1);
+    const std::string errors = readWholeFile(output.path() + ".err");
+    EXPECT_NE(errors.find(input.path() + ": warning: Image 0: the file holds 1014 of the 1024 bytes"),
+              std::string::npos)
+        << errors;
+    EXPECT_EQ(output.read().size(), 1024u) << "what could be read is kept";
+    EXPECT_EQ(run("--allow-partial"), 0);
+    std::remove((output.path() + ".err").c_str());
+}
