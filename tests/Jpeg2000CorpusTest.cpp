@@ -16,6 +16,7 @@
 #include "NitfFileReader.h"
 #include "NitfImageSourceJpeg2000.h"
 #include "Sha256.h"
+#include "TestFiles.h"
 #include "WholeSamples.h"
 
 namespace {
@@ -133,4 +134,107 @@ TEST(Jpeg2000Corpus, EveryJpeg2000ImageDecodes) {
     EXPECT_GE(images, 36);
     std::cout << images << " JPEG 2000 images: " << exact << " exact, " << close << " within tolerance, "
               << unreferenced << " without reference pixels\n";
+}
+
+namespace {
+
+// One component as the OpenJPEG command-line decoder writes it (PGX: a text header, then big-endian samples).
+struct Pgx {
+    int width = 0, height = 0;
+    std::vector<int32_t> samples;
+};
+
+bool readPgx(const std::string& path, Pgx& pgx) {
+    const std::string bytes = readWholeFile(path);
+    const size_t end = bytes.find('\n');
+    char order[3] = {}, sign = '+';
+    int depth = 0;
+    if (end == std::string::npos ||
+        std::sscanf(bytes.c_str(), "PG %2s %c %d %d %d", order, &sign, &depth, &pgx.width, &pgx.height) != 5)
+        return false;
+    const int bytesPerSample = depth <= 8 ? 1 : 2;
+    const unsigned char* data = reinterpret_cast<const unsigned char*>(bytes.data()) + end + 1;
+    if (bytes.size() - end - 1 < size_t(pgx.width) * pgx.height * bytesPerSample)
+        return false;
+    for (int i = 0; i < pgx.width * pgx.height; ++i) {
+        uint32_t v = bytesPerSample == 1 ? data[i] : (data[2 * i] << 8) | data[2 * i + 1];
+        pgx.samples.push_back(sign == '-' ? (bytesPerSample == 1 ? int8_t(v) : int16_t(v)) : int32_t(v));
+    }
+    return true;
+}
+
+bool haveCommand(const char* name) {
+    return std::system((std::string("command -v ") + name + " > /dev/null 2>&1").c_str()) == 0;
+}
+
+} // namespace
+
+// The images the manifest has no pixels for (sub-sampled components, image and tile offsets, packed packet
+// headers) against OpenJPEG's own command-line decoder, component by component: a band on the image grid is
+// its component exactly; a sub-sampled component is replicated over the pixels its samples cover.
+TEST(Jpeg2000Corpus, ImagesWithoutReferencePixelsMatchTheOpenJpegTool) {
+    const Manifest& manifest = Manifest::get();
+    if (manifest.empty())
+        GTEST_SKIP() << "no test corpus";
+    if (!haveCommand("opj_decompress"))
+        GTEST_SKIP() << "opj_decompress is not installed";
+    int checked = 0;
+    for (const CorpusFile& corpusFile : manifest.files()) {
+        for (const nlohmann::json& image : corpusFile.entry->value("images", nlohmann::json::array())) {
+            if (image.value("IC", "") != "C8" || image.at("oracle").value("decoded", false) == true)
+                continue;
+            SCOPED_TRACE(corpusFile.relative);
+            const std::string file = readWholeFile(corpusFile.path);
+            TempFile codestream(
+                file.substr(image.at("data_offset").get<size_t>(), image.at("data_length").get<size_t>()),
+                ".j2k");
+            TempFile output("", ".pgx");
+            const std::string command =
+                "opj_decompress -i " + codestream.path() + " -o " + output.path() + " > /dev/null 2>&1";
+            ASSERT_EQ(std::system(command.c_str()), 0) << command;
+
+            CNitfFileReader reader;
+            ASSERT_TRUE(reader.open(corpusFile.path.c_str()));
+            std::unique_ptr<CNitfImageSourceJpeg2000> source(dynamic_cast<CNitfImageSourceJpeg2000*>(
+                reader.getNewImageSource(image.at("index").get<int>())));
+            ASSERT_TRUE(source);
+            const int width = source->getLevelWidth(0), height = source->getLevelHeight(0);
+            const nlohmann::json& j2k = image.at("j2k");
+            const int bands = source->getImageProperties().getBandCount();
+            std::vector<char> pixels(size_t(width) * height * bands);
+            source->readRegion(&reader, 0, 0, 0, width, height, 0, bands, pixels.data(), width * bands);
+
+            const std::string stem = output.path().substr(0, output.path().size() - 4);
+            int gridDx = 255, gridDy = 255;
+            for (const auto& s : j2k.at("component_subsampling")) {
+                gridDx = std::min(gridDx, s.at(0).get<int>());
+                gridDy = std::min(gridDy, s.at(1).get<int>());
+            }
+            const int originX = (j2k.at("image_offset").at(0).get<int>() + gridDx - 1) / gridDx;
+            const int originY = (j2k.at("image_offset").at(1).get<int>() + gridDy - 1) / gridDy;
+            for (int band = 0; band < bands; ++band) {
+                Pgx component;
+                const std::string path = stem + "_" + std::to_string(band) + ".pgx";
+                ASSERT_TRUE(readPgx(path, component)) << path;
+                std::remove(path.c_str());
+                const int dx = j2k.at("component_subsampling").at(band).at(0).get<int>();
+                const int dy = j2k.at("component_subsampling").at(band).at(1).get<int>();
+                const int componentX = (j2k.at("image_offset").at(0).get<int>() + dx - 1) / dx;
+                const int componentY = (j2k.at("image_offset").at(1).get<int>() + dy - 1) / dy;
+                int mismatches = 0;
+                for (int r = 0; r < height; ++r)
+                    for (int c = 0; c < width; ++c) {
+                        const int x = (originX + c) * gridDx / dx - componentX;
+                        const int y = (originY + r) * gridDy / dy - componentY;
+                        const int expected =
+                            static_cast<uint8_t>(component.samples.at(size_t(y) * component.width + x));
+                        mismatches +=
+                            static_cast<uint8_t>(pixels[(size_t(r) * width + c) * bands + band]) != expected;
+                    }
+                EXPECT_EQ(mismatches, 0) << "band " << band;
+            }
+            ++checked;
+        }
+    }
+    EXPECT_EQ(checked, 6);
 }
