@@ -265,6 +265,7 @@ void CJ2kDecoder::decode(int level, int x, int y, int width, int height, int fir
                          const Output& out) {
     if (!m_range)
         NITF_RAISE(std::string("The JPEG 2000 data is not open"), kDecodeSignature);
+    m_range->forgetFilePosition();
     if (m_bands.empty())
         mapBands(componentCount());
     if (level < 0 || level >= m_resolutionLevels)
@@ -407,8 +408,11 @@ void CJ2kDecoder::copyBands(const opj_image_t* image, const Area& area, int firs
 template <typename Sample>
 void CJ2kDecoder::copyBand(const opj_image_comp_t& comp, const Band& band, const Area& area, char* out,
                            long long rowBytes, int pixelBytes) const {
-    // The window of the component, in its absolute coordinates at this level.
-    const long long windowX = comp.x0, windowY = comp.y0;
+    // The window of the component, in its absolute coordinates at this level. OpenJPEG gives its origin at
+    // full resolution, and a reduced width that may count one column (or row) more than the data has, which
+    // no area inside the image reaches.
+    const long long windowX = ceilDivPow2(comp.x0, static_cast<int>(comp.factor));
+    const long long windowY = ceilDivPow2(comp.y0, static_cast<int>(comp.factor));
     const long long windowW = comp.w, windowH = comp.h;
     const int dx = m_header.components[static_cast<size_t>(band.component)].dx;
     const int dy = m_header.components[static_cast<size_t>(band.component)].dy;

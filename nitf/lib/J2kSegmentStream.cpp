@@ -6,9 +6,10 @@
 
 namespace {
 
-// OpenJPEG reads through its own buffer of this size; larger chunks would only read ahead of what a block
-// needs.
-const OPJ_SIZE_T kStreamChunk = 1 << 20;
+// OpenJPEG reads marker segments through a buffer of this size, and the data of a tile-part straight into
+// its own memory whatever its size. Fetching one tile walks the headers of every tile-part of the
+// codestream, each walk costing one buffer fill: a small buffer keeps that cheap.
+const OPJ_SIZE_T kStreamChunk = 4096;
 
 } // namespace
 
@@ -19,7 +20,7 @@ struct CJ2kSegmentStream::Cursor {
 };
 
 CJ2kSegmentStream::CJ2kSegmentStream(FILE* fp, long long offset, long long length)
-    : m_fp(fp), m_offset(offset), m_length(0), m_bytesRead(0) {
+    : m_fp(fp), m_offset(offset), m_length(0), m_bytesRead(0), m_filePosition(-1) {
     const long long size = fp ? DKSize(fp) : 0;
     if (offset >= 0 && offset < size && length > 0)
         m_length = std::min(length, size - offset);
@@ -36,10 +37,14 @@ size_t CJ2kSegmentStream::readAt(long long position, void* buffer, size_t size) 
         return 0;
     const size_t wanted =
         static_cast<size_t>(std::min<long long>(static_cast<long long>(size), m_length - position));
-    // Every read seeks: the file is shared with the rest of the library, which moves its position freely.
-    if (DKFSeek64(m_fp, m_offset + position, SEEK_SET) != 0)
+    // Reads that follow each other need no seek (a seek drops the stream's buffer); see forgetFilePosition.
+    const long long at = m_offset + position;
+    if (at != m_filePosition && DKFSeek64(m_fp, at, SEEK_SET) != 0) {
+        m_filePosition = -1;
         return 0;
+    }
     const size_t got = DKFRead(buffer, 1, wanted, m_fp);
+    m_filePosition = got == wanted ? at + static_cast<long long>(got) : -1;
     m_bytesRead += static_cast<long long>(got);
     return got;
 }

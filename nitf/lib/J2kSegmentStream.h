@@ -22,6 +22,9 @@ public:
 
     // Reads up to `size` bytes at `position`; returns the count read (short at the end of the range).
     size_t readAt(long long position, void* buffer, size_t size);
+    // The file is shared with the rest of the library, which moves its position freely: call this before a
+    // run of reads that may follow other users of the file.
+    void forgetFilePosition() { m_filePosition = -1; }
 
     // A new OpenJPEG input stream over the range, positioned at its start; destroy it with
     // opj_stream_destroy before this object goes. Each stream has its own position.
@@ -41,4 +44,5 @@ private:
     long long m_offset;
     long long m_length;
     long long m_bytesRead;
+    long long m_filePosition; // where the file stands after this range's last read, or -1
 };
