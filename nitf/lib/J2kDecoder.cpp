@@ -325,7 +325,8 @@ void CJ2kDecoder::checkDecodeSize(long long width, long long height, int level) 
 }
 
 void CJ2kDecoder::decodeUntiled(const Area& area, int firstBand, int bands, const Output& out) {
-    checkDecodeSize(area.refX1 - area.refX0, area.refY1 - area.refY0, area.level);
+    // OpenJPEG decodes just the area, but sets up its code-blocks for the whole tile.
+    checkDecodeSize(m_header.x1 - m_header.x0, m_header.y1 - m_header.y0, area.level);
     if (!m_session || m_session->level != area.level)
         startSession(area.level);
     m_codecError.clear();
