@@ -89,10 +89,10 @@ public:
             opj_set_info_handler(codec, onInfo, nullptr);
         opj_dparameters_t parameters;
         opj_set_default_decoder_parameters(&parameters);
-        // The library runs on its caller's thread only; a damaged or cut codestream decodes as far as it
-        // goes.
+        // The library runs on its caller's thread only. Strict decoding refuses a cut tile rather than
+        // decoding what it holds: this OpenJPEG's lenient mode crashes on some damaged codestreams.
         ok = opj_setup_decoder(codec, &parameters) && opj_codec_set_threads(codec, 0) &&
-             opj_decoder_set_strict_mode(codec, OPJ_FALSE) && opj_read_header(stream, codec, &image) &&
+             opj_decoder_set_strict_mode(codec, OPJ_TRUE) && opj_read_header(stream, codec, &image) &&
              (level == 0 || opj_set_decoded_resolution_factor(codec, static_cast<OPJ_UINT32>(level)));
     }
     ~Session() {
