@@ -81,6 +81,8 @@ private:
     void checkDecodeSize(long long width, long long height, int level) const;
     void copyBands(const struct opj_image* image, const Area& area, int firstBand, int bands,
                    const Output& out) const;
+    bool copyRgb8(const struct opj_image* image, const Area& area, int firstBand, int bands,
+                  const Output& out) const;
     template <typename Sample>
     void copyBand(const struct opj_image_comp& comp, const Band& band, const Area& area, char* out,
                   long long rowBytes, int pixelBytes) const;
