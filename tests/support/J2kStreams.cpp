@@ -57,7 +57,7 @@ Samples pattern(const Coding& coding) {
     const bool isSigned = coding.isSigned;
     return [precision, isSigned](int component, int x, int y) {
         const uint32_t top = (1u << precision) - 1;
-        uint32_t noise = uint32_t(x * 73856093) ^ uint32_t(y * 19349663) ^ uint32_t(component * 83492791);
+        uint32_t noise = uint32_t(x) * 73856093u ^ uint32_t(y) * 19349663u ^ uint32_t(component) * 83492791u;
         noise = (noise * 1103515245u + 12345u) >> 16;
         const uint32_t value = (uint32_t(x * 3 + y * 2 + component * 40) + noise % 16) % (top + 1);
         return isSigned ? int32_t(value) - int32_t(1u << (precision - 1)) : int32_t(value);
