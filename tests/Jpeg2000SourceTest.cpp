@@ -171,31 +171,6 @@ TEST(Jpeg2000Source, RegionsAtEveryLevelMatchAWholeDecode) {
         << "a level the codestream does not have";
 }
 
-// Samples come whole in the NBPP container, native order: sign-extended when signed, zero-extended otherwise.
-TEST(Jpeg2000Source, SamplesFillTheirContainers) {
-    struct Case {
-        int precision;
-        bool isSigned;
-        int nbpp;
-    } cases[] = {{4, true, 4},    {12, true, 12},  {11, false, 16},
-                 {12, false, 12}, {16, false, 16}, {8, true, 8}};
-    for (const Case& c : cases) {
-        SCOPED_TRACE(std::to_string(c.precision) + (c.isSigned ? " signed" : " unsigned") + " bits in NBPP " +
-                     std::to_string(c.nbpp));
-        j2ktest::Coding coding;
-        coding.width = 40;
-        coding.height = 24;
-        coding.precision = c.precision;
-        coding.isSigned = c.isSigned;
-        coding.levels = 2;
-        const auto samples = j2ktest::pattern(coding);
-        OpenedSample sample(fileOf({c8Image(coding, j2ktest::encode(coding, samples), c.nbpp)}));
-        auto source = jpeg2000Source(sample);
-        ASSERT_TRUE(source);
-        expectSamples(wholesamples::readBlocks(sample.reader(), *source), samples);
-    }
-}
-
 // Chroma at half size (4:2:0) is replicated: each of its samples covers 2 x 2 pixels.
 TEST(Jpeg2000Source, SubsampledComponentsAreReplicatedToTheImageSize) {
     j2ktest::Coding coding;

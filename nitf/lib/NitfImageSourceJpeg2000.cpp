@@ -21,6 +21,16 @@ const char kBlockSignature[] =
 const char kRegionSignature[] = "void __cdecl CNitfImageSourceJpeg2000::readRegion(class CNitfFile *,int,int,"
                                 "int,int,int,int,int,char *,int)";
 
+// Pixel-interleaved bands of `sampleBytes` each, rows `rowBytes` apart.
+CJ2kDecoder::Output outputFor(char* buffer, int rowBytes, int bands, int sampleBytes) {
+    CJ2kDecoder::Output out;
+    out.buffer = buffer;
+    out.rowBytes = rowBytes;
+    out.sampleBytes = sampleBytes;
+    out.pixelBytes = bands * sampleBytes;
+    return out;
+}
+
 } // namespace
 
 CNitfImageSourceJpeg2000::CNitfImageSourceJpeg2000(CNitfImageSubheader* subheader, char* fileName)
@@ -113,13 +123,9 @@ bool CNitfImageSourceJpeg2000::decodeBlock(CNitfFile* file, int x, int y, int fi
     if (width <= 0 || height <= 0)
         return true; // a block wholly outside the codestream's image: padding only
 
-    CJ2kDecoder::Output out;
-    out.buffer = buffer;
-    out.rowBytes = rowBytes;
-    out.sampleBytes = sampleBytes;
-    out.pixelBytes = bands * sampleBytes;
     decoder.decode(0, static_cast<int>(left), static_cast<int>(top), static_cast<int>(width),
-                   static_cast<int>(height), firstBand, bands, out);
+                   static_cast<int>(height), firstBand, bands,
+                   outputFor(buffer, rowBytes, bands, sampleBytes));
     return true;
 }
 
@@ -144,12 +150,8 @@ void CNitfImageSourceJpeg2000::readRegion(CNitfFile* file, int level, int x, int
     if (static_cast<long long>(width) * bands * sampleBytes > rowBytes)
         NITF_RAISE_FORMAT(kRegionSignature, "Rows of %d bytes cannot hold %d pixels of %d bands", rowBytes,
                           width, bands);
-    CJ2kDecoder::Output out;
-    out.buffer = buffer;
-    out.rowBytes = rowBytes;
-    out.sampleBytes = sampleBytes;
-    out.pixelBytes = bands * sampleBytes;
-    decoder.decode(level, x, y, width, height, firstBand, bands, out);
+    decoder.decode(level, x, y, width, height, firstBand, bands,
+                   outputFor(buffer, rowBytes, bands, sampleBytes));
 }
 
 long long CNitfImageSourceJpeg2000::getTileDecodeCount() const {
