@@ -276,3 +276,26 @@ TEST(Jpeg2000Source, SeveralImagesInOneFile) {
             error += std::abs(lossy.bands[1][size_t(y) * lossy.cols + x] - rgbSamples(1, x, y));
     EXPECT_LT(error / (lossy.rows * lossy.cols), 8.0) << "lossy, yet close";
 }
+
+// "M8": the block mask record comes first; the codestream follows it, and a block marked absent is not read.
+TEST(Jpeg2000Source, MaskedImagesSkipAbsentBlocks) {
+    j2ktest::Coding coding;
+    coding.width = coding.height = 64;
+    coding.tileWidth = coding.tileHeight = 32;
+    coding.levels = 2;
+    const auto samples = j2ktest::pattern(coding);
+    nitfsample::Image image = c8Image(coding, "");
+    image.ic = "M8";
+    image.blockData = {j2ktest::encode(coding, samples), "", "", ""};
+    image.absentBlocks = {3};
+    OpenedSample sample(fileOf({image}));
+    auto source = jpeg2000Source(sample);
+    ASSERT_TRUE(source);
+    std::vector<unsigned char> block(32 * 32, 0xAA);
+    char* buffer = reinterpret_cast<char*>(block.data());
+    ASSERT_TRUE(source->readTileNonInterleaved(&sample.reader(), buffer, 0, 0, 1));
+    EXPECT_EQ(block[5 * 32 + 7], samples(0, 7, 32 + 5));
+    EXPECT_FALSE(source->readTileNonInterleaved(&sample.reader(), buffer, 0, 1, 1));
+    EXPECT_EQ(block[5 * 32 + 7], 0);
+    EXPECT_EQ(source->getTileDecodeCount(), 1);
+}
