@@ -50,6 +50,7 @@
 #include "NitfImagePropertiesIF.h"
 #include "NitfImageSource.h"
 #include "NitfImageSourceJpeg.h"
+#include "NitfImageSourceJpeg2000.h"
 #include "NitfImageSourceUncompressed.h"
 #include "NitfImageSubheader.h"
 #include "NitfImageSubheaderV10.h"

@@ -12,6 +12,7 @@
 #include "NitfImageSource.h"
 #include "NitfImagePropertiesIF.h"
 #include "NitfImageSourceJpeg.h"
+#include "NitfImageSourceJpeg2000.h"
 #include "NitfImageSourceUncompressed.h"
 #include "NitfImageSubheader.h"
 #include "NitfLabelSource.h"
@@ -228,6 +229,9 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
         case CNitfImagePropertiesIF::eCompressionDownsampledJpeg:
             source = new CNitfImageSourceJpeg(subheader, nullptr);
             break;
+        case CNitfImagePropertiesIF::eCompressionJpeg2000:
+            source = new CNitfImageSourceJpeg2000(subheader, nullptr);
+            break;
         case CNitfImagePropertiesIF::eCompressionAridPcm:
             NITF_RAISE("AridPcm compression not supported (ISH.IC == M2/C2)", kImageSourceSignature);
         case CNitfImagePropertiesIF::eCompressionCorrelated:
@@ -240,7 +244,7 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
             NITF_RAISE_FORMAT(kImageSourceSignature, "Unsupported compression type (ISH.IC == M%d/C%d)",
                               static_cast<int>(code->type), static_cast<int>(code->type));
         default:
-            // Decoders that have not landed yet: bi-level, VQ and JPEG 2000.
+            // Decoders that have not landed yet: bi-level and VQ.
             NITF_RAISE_FORMAT(kImageSourceSignature,
                               "Compression not yet supported by this build (ISH.IC == %s)",
                               nitf_detail::printable(ic).c_str());
