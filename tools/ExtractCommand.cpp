@@ -38,6 +38,8 @@ const char kUsage[] =
     "  -b, --band N           one band, from 0\n"
     "      --bands LIST       bands, from 0, in this order: 0,2,1\n"
     "      --window X,Y,W,H   part of the image: W x H pixels from column X, row Y\n"
+    "      --level N          a reduced resolution level (JPEG 2000): the image halved N times; the window\n"
+    "                         is at that level\n"
     "  -j, --threads N        decoding threads for raw output to a file (default: the processors)\n"
     "      --allow-partial    exit 0 even when blocks could not be decoded (they are written as zeros)\n"
     "  -h, --help             this text\n";
@@ -55,6 +57,7 @@ struct Options {
     std::vector<int> bands;
     nitfextract::Window window;
     int threads = 0;
+    int level = 0;
     bool allowPartial = false;
 };
 
@@ -79,13 +82,18 @@ std::vector<int> parseList(const std::string& text, const char* what) {
 }
 
 Options parseOptions(int argc, char** argv) {
-    enum { kBands = 1000, kWindow, kAllowPartial };
-    static const option longOptions[] = {
-        {"image", required_argument, nullptr, 'i'},    {"band", required_argument, nullptr, 'b'},
-        {"bands", required_argument, nullptr, kBands}, {"window", required_argument, nullptr, kWindow},
-        {"format", required_argument, nullptr, 'f'},   {"output", required_argument, nullptr, 'o'},
-        {"threads", required_argument, nullptr, 'j'},  {"allow-partial", no_argument, nullptr, kAllowPartial},
-        {"help", no_argument, nullptr, 'h'},           {nullptr, 0, nullptr, 0}};
+    enum { kBands = 1000, kWindow, kLevel, kAllowPartial };
+    static const option longOptions[] = {{"image", required_argument, nullptr, 'i'},
+                                         {"band", required_argument, nullptr, 'b'},
+                                         {"bands", required_argument, nullptr, kBands},
+                                         {"window", required_argument, nullptr, kWindow},
+                                         {"level", required_argument, nullptr, kLevel},
+                                         {"format", required_argument, nullptr, 'f'},
+                                         {"output", required_argument, nullptr, 'o'},
+                                         {"threads", required_argument, nullptr, 'j'},
+                                         {"allow-partial", no_argument, nullptr, kAllowPartial},
+                                         {"help", no_argument, nullptr, 'h'},
+                                         {nullptr, 0, nullptr, 0}};
     // getopt wants the program's name first.
     std::vector<char*> args{const_cast<char*>("nitf extract")};
     args.insert(args.end(), argv, argv + argc);
@@ -113,6 +121,9 @@ Options parseOptions(int argc, char** argv) {
                 throw UsageError(std::string("an empty window '") + optarg + "'");
             break;
         }
+        case kLevel:
+            options.level = parseNumber(optarg, "level");
+            break;
         case 'f':
             options.format = optarg;
             break;
@@ -180,6 +191,7 @@ int extract(const Options& options) {
         request.window = options.window;
         request.bands = options.bands;
         request.threads = options.threads;
+        request.level = options.level;
         std::fflush(out.get());
         outcome = nitfextract::writeRaw(request, out.descriptor(), progress);
     } else {
@@ -190,13 +202,14 @@ int extract(const Options& options) {
             throw std::runtime_error("the file has " + std::to_string(reader.getImageCount()) +
                                      " image segment(s); there is no image " + std::to_string(options.image));
         std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(options.image));
-        outcome = writePicture(reader, *source, options.window, options.bands, options.format == "png",
-                               out.get(), progress);
+        outcome = writePicture(reader, *source, options.window, options.bands, options.level,
+                               options.format == "png", out.get(), progress);
     }
     if (outcome.failedBlocks > 0) {
-        std::fprintf(stderr,
-                     "nitf extract: %s: %d block(s) could not be read whole (zeros stand for what is missing): %s\n",
-                     options.file.c_str(), outcome.failedBlocks, outcome.firstError.c_str());
+        std::fprintf(
+            stderr,
+            "nitf extract: %s: %d block(s) could not be read whole (zeros stand for what is missing): %s\n",
+            options.file.c_str(), outcome.failedBlocks, outcome.firstError.c_str());
         if (!options.allowPartial) {
             std::fprintf(stderr, "nitf extract: %s: keeping %s anyway; --allow-partial accepts this\n",
                          options.file.c_str(), options.output.c_str());

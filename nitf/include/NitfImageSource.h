@@ -102,6 +102,18 @@ public:
     // Whether the file records block (x, y) (band `band` for IMODE S) as absent: a masked image's block mask
     // entry 0xFFFFFFFF, or an image whose blocks could not be located. Such blocks read as zeros.
     bool isBlockAbsent(int x, int y, int band) const;
+    // Resolution levels the source can read straight from its data: level 0 is the image, level N the image
+    // reduced N times by two (JPEG 2000 codestreams have them; other sources only level 0).
+    virtual int getResolutionLevels() const;
+    // The image's size at `level`.
+    virtual int getLevelWidth(int level) const;
+    virtual int getLevelHeight(int level) const;
+    // Bands [firstBand, firstBand + bands) of the area x, y, width, height at `level` (coordinates at that
+    // level), pixel-interleaved, rows `rowBytes` apart, whole samples as block reads deliver them. Raises
+    // vexo::Exception for a level the source does not have, an area outside the image or damaged data.
+    virtual void readRegion(CNitfFile* file, int level, int x, int y, int width, int height, int firstBand,
+                            int bands, char* buffer, int rowBytes);
+
     // How many block entries have been decoded (read from the file) so far.
     long long getDecodeCount() const { return m_decodeCount; }
     // How many block reads met data the file does not hold (cut short, or a block that should be there and is

@@ -26,22 +26,17 @@ public:
     // Reads the JPEG 2000 headers. Raises vexo::Exception when the data is not JPEG 2000, its headers are
     // damaged, or it cannot give the image's bands in NBPP bits.
     void readStart(FILE* fp, long long dataOffset, long long dataLength) override;
-    // All bands of block (x, y), pixel-interleaved; false when the block is absent (masked). Raises
-    // vexo::Exception for a damaged codestream.
-    bool readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y) override;
-    // Band `band` of block (x, y); as above.
-    bool readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y, int band) override;
 
     // Resolution levels the codestream has: level 0 is the full image, level N is reduced by 2^N.
-    int getResolutionLevels() const;
+    int getResolutionLevels() const override;
     // The image's size at `level` (the codestream's image: normally NCOLS x NROWS at level 0).
-    int getLevelWidth(int level) const;
-    int getLevelHeight(int level) const;
+    int getLevelWidth(int level) const override;
+    int getLevelHeight(int level) const override;
     // Bands [firstBand, firstBand + bands) of the area x, y, width, height at `level` (coordinates at that
     // level), pixel-interleaved: row r at buffer + r * rowBytes. Raises vexo::Exception for an area outside
     // the image and for a damaged codestream; the source stays usable.
     void readRegion(CNitfFile* file, int level, int x, int y, int width, int height, int firstBand, int bands,
-                    char* buffer, int rowBytes);
+                    char* buffer, int rowBytes) override;
 
     // OpenJPEG tile decodes, and bytes of the image data read, so far.
     long long getTileDecodeCount() const;
@@ -50,12 +45,16 @@ public:
 protected:
     void prepareTileOffsets(FILE* fp, long long dataOffset, long long dataLength, unsigned int* blockMask,
                             int count) override;
+    // Every band comes out of one decode of the codestream's area under the block: pixel-interleaved.
+    eBlockLayout_t getBlockLayout() const override;
+    // Decodes every band of the block of entry `entry` (the area of the image under it; its padding
+    // zero-filled); false when it is absent. Raises vexo::Exception for a damaged codestream.
+    bool decodeBlock(FILE* fp, int entry, int band, unsigned char* buffer, int rowBytes,
+                     bool interleaved) override;
 
 private:
-    // Decodes bands [firstBand, firstBand + bands) of block (x, y) into `buffer`; false when it is absent.
-    bool decodeBlock(CNitfFile* file, int x, int y, int firstBand, int bands, char* buffer, int rowBytes);
-    // The decoder, reopened on `file`'s stream when reads come through another file than the last.
-    CJ2kDecoder& decoderFor(CNitfFile* file);
+    // The decoder, reopened on `fp` when reads come through another stream than the last.
+    CJ2kDecoder& decoderFor(FILE* fp);
 
     std::unique_ptr<CJ2kDecoder> m_decoder;
     FILE* m_fp;

@@ -69,6 +69,13 @@ public:
     // Delivers samples big-endian instead of in native order.
     void setBigEndian(bool bigEndian) { m_bigEndianOut = bigEndian; }
 
+    // Reads resolution level `level` from now on (0: the image; N: reduced N times by two, for sources that
+    // hold such levels, see CNitfImageSource::getResolutionLevels); windows, getWidth and getHeight are at
+    // that level. Raises vexo::Exception for a level the source does not have.
+    void setLevel(int level);
+    int getLevel() const { return m_level; }
+    int getResolutionLevels() const;
+
     // How many rows, at most, to read at a time for windows `width` pixels wide of `bands` bands so that a
     // read needs no more than about `budget` bytes: a whole block row, unless that is larger and the source
     // can read parts of blocks without decoding them whole. Always at least one row; callers start their
@@ -94,6 +101,9 @@ private:
         size_t pixelStride, rowStride;
     };
 
+    // A window at a reduced level, through the source's own region read.
+    void readReduced(int x, int y, int width, int height, const std::vector<int>& bands, unsigned char* out,
+                     eLayout_t layout, Result& result);
     void readBlockBand(int blockX, int blockY, int band, const Target& target, bool wholeBlock,
                        Result& result);
     // Reads only the target's rows of a block, when the source can; false otherwise.
@@ -120,6 +130,7 @@ private:
     bool m_bigEndianIn;   // whole samples in the blocks are big-endian
     int m_deliveredBytes; // bytes of a whole sample in the blocks
     bool m_bigEndianOut = false;
+    int m_level = 0;
     int m_blockRowBytes;
     std::vector<unsigned char> m_block;
 };

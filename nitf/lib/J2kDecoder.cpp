@@ -327,8 +327,9 @@ void CJ2kDecoder::checkDecodeSize(long long width, long long height, int level) 
 void CJ2kDecoder::decodeUntiled(const Area& area, int firstBand, int bands, const Output& out) {
     // OpenJPEG decodes just the area, but sets up its code-blocks for the whole tile.
     checkDecodeSize(m_header.x1 - m_header.x0, m_header.y1 - m_header.y0, area.level);
-    if (!m_session || m_session->level != area.level)
-        startSession(area.level);
+    // A codec that has decoded once cannot always decode another area (OpenJPEG then asks for the main
+    // header again): every area starts on a codec of its own, as tiles do.
+    startSession(area.level);
     m_codecError.clear();
     if (!opj_set_decode_area(m_session->codec, m_session->image, static_cast<OPJ_INT32>(area.refX0),
                              static_cast<OPJ_INT32>(area.refY0), static_cast<OPJ_INT32>(area.refX1),

@@ -269,6 +269,25 @@ bool CNitfImageSource::decodeBlockRows(FILE*, int, int, int, int, unsigned char*
     return false;
 }
 
+int CNitfImageSource::getResolutionLevels() const {
+    return 1;
+}
+
+int CNitfImageSource::getLevelWidth(int level) const {
+    return level == 0 ? m_properties.getImageActualWidth() : 0;
+}
+
+int CNitfImageSource::getLevelHeight(int level) const {
+    return level == 0 ? m_properties.getImageActualHeight() : 0;
+}
+
+void CNitfImageSource::readRegion(CNitfFile*, int level, int, int, int, int, int, int, char*, int) {
+    NITF_RAISE_FORMAT(
+        "void __cdecl CNitfImageSource::readRegion(class CNitfFile *,int,int,int,int,int,int,int,"
+        "char *,int)",
+        "This image cannot be read at reduced resolution level %d", level);
+}
+
 bool CNitfImageSource::canDecodeBlockRows() const {
     return false;
 }

@@ -17,7 +17,7 @@ namespace {
 const char kStartSignature[] =
     "void __cdecl CNitfImageSourceJpeg2000::readStart(" NITF_FILE_SIG ",__int64,__int64)";
 const char kBlockSignature[] =
-    "bool __cdecl CNitfImageSourceJpeg2000::decodeBlock(class CNitfFile *,int,int,int,int,char *,int)";
+    "bool __cdecl CNitfImageSourceJpeg2000::decodeBlock(" NITF_FILE_SIG ",int,int,unsigned char *,int,bool)";
 const char kRegionSignature[] = "void __cdecl CNitfImageSourceJpeg2000::readRegion(class CNitfFile *,int,int,"
                                 "int,int,int,int,int,char *,int)";
 
@@ -73,8 +73,7 @@ void CNitfImageSourceJpeg2000::readStart(FILE* fp, long long dataOffset, long lo
     m_fp = fp;
 }
 
-CJ2kDecoder& CNitfImageSourceJpeg2000::decoderFor(CNitfFile* file) {
-    FILE* fp = file ? file->getInputStream() : nullptr;
+CJ2kDecoder& CNitfImageSourceJpeg2000::decoderFor(FILE* fp) {
     if (!m_decoder || !fp)
         NITF_RAISE(std::string("The JPEG 2000 image has not been started for reading"), kBlockSignature);
     if (fp != m_fp) {
@@ -87,27 +86,21 @@ CJ2kDecoder& CNitfImageSourceJpeg2000::decoderFor(CNitfFile* file) {
 
 // ---- blocks -----------------------------------------------------------------------------------------------
 
-bool CNitfImageSourceJpeg2000::readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x,
-                                                   int y) {
-    return decodeBlock(file, x, y, 0, m_properties.getBandCount(), buffer, rowBytes);
-}
-
-bool CNitfImageSourceJpeg2000::readTileNonInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x,
-                                                      int y, int band) {
-    return decodeBlock(file, x, y, band, 1, buffer, rowBytes);
+CNitfImageSource::eBlockLayout_t CNitfImageSourceJpeg2000::getBlockLayout() const {
+    return m_properties.getBandCount() < 2 ? eBlockBands : eBlockPixels;
 }
 
 // A block is the area of the image under it. Blocks reaching past the image (the padding of the last block
 // row and column) are zero-filled there.
-bool CNitfImageSourceJpeg2000::decodeBlock(CNitfFile* file, int x, int y, int firstBand, int bands,
-                                           char* buffer, int rowBytes) {
+bool CNitfImageSourceJpeg2000::decodeBlock(FILE* fp, int entry, int, unsigned char* out, int rowBytes, bool) {
     const CNitfImagePropertiesIF& p = m_properties;
-    if (!buffer || x < 0 || y < 0 || x >= p.getTileCountX() || y >= p.getTileCountY() || firstBand < 0 ||
-        firstBand + bands > p.getBandCount())
+    if (entryOffset(entry) == kAbsentBlock || p.getTileCountX() <= 0 || p.getTileCountY() <= 0)
         return false;
-    if (getTileOffset(p.getTileIndex(x, y)) == kAbsentBlock)
-        return false;
-    CJ2kDecoder& decoder = decoderFor(file);
+    // Band-sequential images number their entries band after band; every band lies in the one codestream.
+    const int x = entry % p.getTileCountX(), y = entry / p.getTileCountX() % p.getTileCountY();
+    const int firstBand = 0, bands = p.getBandCount();
+    char* buffer = reinterpret_cast<char*>(out);
+    CJ2kDecoder& decoder = decoderFor(fp);
     const int sampleBytes = p.getSampleContainerBytes();
     const long long blockWidth = p.getTileWidth(), blockHeight = p.getTileHeight();
     if (blockWidth * bands * sampleBytes > rowBytes)
@@ -145,7 +138,7 @@ int CNitfImageSourceJpeg2000::getLevelHeight(int level) const {
 
 void CNitfImageSourceJpeg2000::readRegion(CNitfFile* file, int level, int x, int y, int width, int height,
                                           int firstBand, int bands, char* buffer, int rowBytes) {
-    CJ2kDecoder& decoder = decoderFor(file);
+    CJ2kDecoder& decoder = decoderFor(file ? file->getInputStream() : nullptr);
     const int sampleBytes = m_properties.getSampleContainerBytes();
     if (static_cast<long long>(width) * bands * sampleBytes > rowBytes)
         NITF_RAISE_FORMAT(kRegionSignature, "Rows of %d bytes cannot hold %d pixels of %d bands", rowBytes,

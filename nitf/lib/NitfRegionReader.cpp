@@ -144,6 +144,22 @@ const char* CNitfRegionReader::getSampleTypeName(eSampleType_t type) {
     return type >= eUInt8 && type <= eComplexFloat64 ? names[type] : "unknown";
 }
 
+int CNitfRegionReader::getResolutionLevels() const {
+    return m_source->getResolutionLevels();
+}
+
+void CNitfRegionReader::setLevel(int level) {
+    if (level < 0 || level >= m_source->getResolutionLevels())
+        NITF_RAISE_FORMAT("void __cdecl CNitfRegionReader::setLevel(int)",
+                          "The image has %d resolution level(s); there is no level %d",
+                          m_source->getResolutionLevels(), level);
+    // Level 0 is the image as the sub-header describes it, whatever size its data code.
+    const CNitfImagePropertiesIF& p = m_source->getImageProperties();
+    m_level = level;
+    m_width = level == 0 ? p.getImageActualWidth() : m_source->getLevelWidth(level);
+    m_height = level == 0 ? p.getImageActualHeight() : m_source->getLevelHeight(level);
+}
+
 size_t CNitfRegionReader::getBufferSize(int width, int height, int bands) const {
     if (width <= 0 || height <= 0 || bands <= 0)
         return 0;
@@ -189,6 +205,10 @@ CNitfRegionReader::Result CNitfRegionReader::read(int x, int y, int width, int h
     unsigned char* output = static_cast<unsigned char*>(out);
 
     Result result;
+    if (m_level > 0) {
+        readReduced(x, y, width, height, bands, output, layout, result);
+        return result;
+    }
     const int firstBlockY = y / m_blockHeight, lastBlockY = (y + height - 1) / m_blockHeight;
     const int firstBlockX = x / m_blockWidth, lastBlockX = (x + width - 1) / m_blockWidth;
     for (int blockY = firstBlockY; blockY <= lastBlockY; ++blockY) {
@@ -214,6 +234,40 @@ CNitfRegionReader::Result CNitfRegionReader::read(int x, int y, int width, int h
         }
     }
     return result;
+}
+
+// Reduced levels come from the source's region read: one decode of every band from the lowest asked for to
+// the highest, pixel-interleaved, then each band put in its place.
+void CNitfRegionReader::readReduced(int x, int y, int width, int height, const std::vector<int>& bands,
+                                    unsigned char* out, eLayout_t layout, Result& result) {
+    const int first = *std::min_element(bands.begin(), bands.end());
+    const int last = *std::max_element(bands.begin(), bands.end());
+    const int span = last - first + 1;
+    const size_t row = static_cast<size_t>(width) * span * m_sampleBytes;
+    const size_t pixelStride = layout == ePixelInterleaved ? bands.size() * m_sampleBytes : m_sampleBytes;
+    const size_t rowStride = pixelStride * width;
+    std::vector<unsigned char> decoded(row * height);
+    try {
+        if (row > static_cast<size_t>(INT32_MAX))
+            NITF_RAISE("A reduced-resolution window row is too long",
+                       "void __cdecl CNitfRegionReader::readReduced(void)");
+        m_source->readRegion(m_file, m_level, x, y, width, height, first, span,
+                             reinterpret_cast<char*>(decoded.data()), static_cast<int>(row));
+    } catch (const vexo::Exception& e) {
+        if (result.failedBlocks++ == 0)
+            result.firstError = e.what();
+    }
+    const bool swap = m_elementBytes > 1 && m_bigEndianOut != kHostBigEndian;
+    for (size_t k = 0; k < bands.size(); ++k) {
+        unsigned char* plane =
+            out + (layout == ePixelInterleaved ? k * m_sampleBytes : k * rowStride * height);
+        for (int r = 0; r < height; ++r)
+            for (int c = 0; c < width; ++c)
+                copySamples(plane + r * rowStride + c * pixelStride, m_sampleBytes,
+                            decoded.data() + r * row +
+                                (static_cast<size_t>(c) * span + bands[k] - first) * m_sampleBytes,
+                            1, m_sampleBytes, m_elementBytes, swap);
+    }
 }
 
 void CNitfRegionReader::readBlockBand(int blockX, int blockY, int band, const Target& target, bool wholeBlock,

@@ -41,6 +41,7 @@ struct OpenImage {
         source.reset(reader.getNewImageSource(request.image));
         region.reset(new CNitfRegionReader(&reader, source.get()));
         region->setBigEndian(true);
+        region->setLevel(request.level);
     }
     CNitfFileReader reader;
     std::unique_ptr<CNitfImageSource> source;
@@ -51,9 +52,18 @@ struct OpenImage {
 // columns or rows), so that no piece decodes a block another piece needs.
 std::vector<Piece> cutWindow(const CNitfRegionReader& region, const CNitfImageSource& source,
                              const Window& window, int bands, bool fullRows) {
+    // Pieces start on block rows (and columns) so that no two pieces decode the same block.
     const CNitfImagePropertiesIF& p = source.getImageProperties();
-    const int blockHeight = p.getTileHeight(), blockWidth = p.getTileWidth();
-    const int rowsPerRead = region.getRowsPerRead(window.width, bands, kReadBudget);
+    int blockHeight = p.getTileHeight(), blockWidth = p.getTileWidth();
+    int rowsPerRead = region.getRowsPerRead(window.width, bands, kReadBudget);
+    if (region.getLevel() > 0) {
+        // Reduced levels are read by area, not by block: rows that fit the budget, the whole width.
+        const size_t row = std::max<size_t>(1, region.getBufferSize(window.width, 1, bands));
+        blockHeight = rowsPerRead =
+            static_cast<int>(std::max<size_t>(1, std::min<size_t>(kReadBudget / row, 1024)));
+        blockWidth = window.width;
+        fullRows = true;
+    }
     int colsPerRead = window.width;
     if (!fullRows && rowsPerRead == blockHeight)
         colsPerRead =

@@ -20,6 +20,7 @@ struct Request {
     Window window;          // part of the image (NCOLS x NROWS)
     std::vector<int> bands; // 0-based; empty: every band
     int threads = 1;        // decoding threads, each with its own reader of the file
+    int level = 0;          // resolution level (the window is at that level); see CNitfRegionReader::setLevel
 };
 
 struct Outcome {

@@ -250,17 +250,20 @@ PictureFormat pictureFormat(View& view, int width, int height, int bits, bool pn
 } // namespace
 
 nitfextract::Outcome writePicture(CNitfFileReader& reader, CNitfImageSource& source,
-                                  const nitfextract::Window& requested, const std::vector<int>& bands,
+                                  const nitfextract::Window& requested, const std::vector<int>& bands, int level,
                                   bool png, FILE* out, const nitfextract::Progress& progress) {
     CNitfRegionReader region(&reader, &source);
     region.setBigEndian(true); // the canonical bytes sampleValue reads
+    region.setLevel(level);
     const nitfextract::Window window =
         nitfextract::resolveWindow(requested, region.getWidth(), region.getHeight());
     View view = chooseView(reader, source, bands);
     const CNitfImagePropertiesIF::ePVType_t type = source.getPvtype();
     const int bits = source.getImageProperties().getBpp();
     const int sampleBytes = region.getSampleBytes();
-    const int blockHeight = source.getImageProperties().getTileHeight();
+    // Strips of whole block rows at full resolution (each block decoded once per pass); reduced levels are
+    // read by area.
+    const int blockHeight = level > 0 ? 256 : source.getImageProperties().getTileHeight();
     const int channels = static_cast<int>(view.bands.size());
 
     // Strips of whole block rows: every block is decoded once per pass.

@@ -12,6 +12,7 @@ class CNitfImageSource;
 
 // Writes a PNG (`png`) or PGM/PPM picture of the window of `bands` (0-based: none for the default view,
 // one for grey or a look-up table, three for RGB) to `out`. Returns the blocks that could not be decoded.
+// `level` is a reduced resolution level (see CNitfRegionReader::setLevel).
 nitfextract::Outcome writePicture(CNitfFileReader& reader, CNitfImageSource& source,
-                                  const nitfextract::Window& window, const std::vector<int>& bands, bool png,
-                                  FILE* out, const nitfextract::Progress& progress);
+                                  const nitfextract::Window& window, const std::vector<int>& bands, int level,
+                                  bool png, FILE* out, const nitfextract::Progress& progress);
