@@ -49,6 +49,7 @@
 #include "NitfHeaderDataPair.h"
 #include "NitfImagePropertiesIF.h"
 #include "NitfImageSource.h"
+#include "NitfImageSourceBilevel.h"
 #include "NitfImageSourceJpeg.h"
 #include "NitfImageSourceUncompressed.h"
 #include "NitfImageSubheader.h"

@@ -11,6 +11,7 @@
 #include "NitfFileHeaderV21.h"
 #include "NitfImageSource.h"
 #include "NitfImagePropertiesIF.h"
+#include "NitfImageSourceBilevel.h"
 #include "NitfImageSourceJpeg.h"
 #include "NitfImageSourceUncompressed.h"
 #include "NitfImageSubheader.h"
@@ -211,6 +212,9 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
         case CNitfImagePropertiesIF::eCompressionUncompressed:
             source = new CNitfImageSourceUncompressed(subheader, nullptr);
             break;
+        case CNitfImagePropertiesIF::eCompressionBilevel:
+            source = new CNitfImageSourceBilevel(subheader, nullptr);
+            break;
         case CNitfImagePropertiesIF::eCompressionJpeg:
         case CNitfImagePropertiesIF::eCompressionJpegLossless:
         case CNitfImagePropertiesIF::eCompressionDownsampledJpeg:
@@ -228,7 +232,7 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
             NITF_RAISE_FORMAT(kImageSourceSignature, "Unsupported compression type (ISH.IC == M%d/C%d)",
                               static_cast<int>(code->type), static_cast<int>(code->type));
         default:
-            // Decoders that have not landed yet: bi-level, VQ and JPEG 2000.
+            // Decoders that have not landed yet: VQ and JPEG 2000.
             NITF_RAISE_FORMAT(kImageSourceSignature,
                               "Compression not yet supported by this build (ISH.IC == %s)", ic.c_str());
         }

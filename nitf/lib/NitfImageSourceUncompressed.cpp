@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <climits>
-#include <cmath>
 #include <cstdint>
 #include <cstring>
 
@@ -10,9 +9,12 @@
 #include "HostFile.h"
 #include "HostMemory.h"
 #include "NitfFile.h"
+#include "PackedBits.h"
 #include "Raise.h"
 
 static const char kSourceFile[] = "nitf/lib/NitfImageSourceUncompressed";
+
+using packedbits::copyBits;
 
 namespace {
 
@@ -25,52 +27,6 @@ void readAt(FILE* fp, unsigned long long offset, char* buffer, size_t size) {
     __int64 position =
         offset <= static_cast<unsigned long long>(LLONG_MAX) ? static_cast<__int64>(offset) : -1;
     CDataStream::readZeroFilledAt(fp, position, buffer, size);
-}
-
-// ---- bit streams, most significant bit first --------------------------------------------------------------
-
-inline bool getBit(const unsigned char* data, uint64_t bit) {
-    return (data[bit >> 3] >> (7 - (bit & 7))) & 1;
-}
-
-inline void putBit(unsigned char* data, uint64_t bit, bool value) {
-    const unsigned char mask = static_cast<unsigned char>(0x80 >> (bit & 7));
-    if (value)
-        data[bit >> 3] |= mask;
-    else
-        data[bit >> 3] &= static_cast<unsigned char>(~mask);
-}
-
-// Copies `count` bits between arbitrary bit positions; whole destination bytes are assembled at once.
-void copyBits(unsigned char* dst, uint64_t dstBit, const unsigned char* src, uint64_t srcBit,
-              uint64_t count) {
-    for (; count > 0 && (dstBit & 7) != 0; --count)
-        putBit(dst, dstBit++, getBit(src, srcBit++));
-    unsigned char* out = dst + (dstBit >> 3);
-    const unsigned char* in = src + (srcBit >> 3);
-    const unsigned shift = srcBit & 7;
-    const uint64_t bytes = count >> 3;
-    if (shift == 0) {
-        std::memcpy(out, in, bytes);
-    } else {
-        // The last byte assembled needs the first bits of in[bytes], which still belong to the copied range.
-        for (uint64_t i = 0; i < bytes; ++i)
-            out[i] = static_cast<unsigned char>((in[i] << shift) | (in[i + 1] >> (8 - shift)));
-    }
-    dstBit += bytes << 3;
-    srcBit += bytes << 3;
-    for (count &= 7; count > 0; --count)
-        putBit(dst, dstBit++, getBit(src, srcBit++));
-}
-
-void setBits(unsigned char* data, uint64_t bit, uint64_t count, bool value) {
-    for (; count > 0; --count)
-        putBit(data, bit++, value);
-}
-
-void invertBits(unsigned char* data, uint64_t bit, uint64_t count) {
-    for (; count > 0; --count, ++bit)
-        putBit(data, bit, !getBit(data, bit));
 }
 
 unsigned char* bytes(char* data) {
@@ -272,28 +228,9 @@ char* CNitfImageSourceUncompressed::ReassemblingBitmap(const char* data, long lo
 
 bool CNitfImageSourceUncompressed::readBitmap(char* buffer, int x0, int y0, int width, int srcRows,
                                               int outWidthBits, int outRows) {
-    if (!m_workBuffer || !buffer || x0 < 0 || y0 < 0 || width < 0 || outWidthBits < width || outRows < 0 ||
-        x0 + static_cast<long long>(width) > m_bitmapRowBits)
-        return false;
-    // Nearest-lower row sampling; columns are not resampled.
-    const double ratio = outRows > 0 ? static_cast<double>(srcRows) / outRows : 0.0;
-    auto sourceRow = [&](int i) { return static_cast<long long>(std::floor(i * ratio)) + y0; };
-    if (outRows > 0) {
-        const long long first = sourceRow(0), last = sourceRow(outRows - 1);
-        if (std::min(first, last) < 0 || std::max(first, last) >= m_bitmapRows)
-            return false;
-    }
-    unsigned char* out = bytes(buffer);
-    const unsigned char* bitmap = bytes(m_workBuffer);
-    for (int i = 0; i < outRows; ++i) {
-        const long long dstBit = static_cast<long long>(i) * outWidthBits;
-        copyBits(out, dstBit, bitmap, sourceRow(i) * m_bitmapRowBits + x0, width);
-        setBits(out, dstBit + width, outWidthBits - width, false);
-        // A file whose background is 1 is delivered with background 0.
-        if (m_padPixelValue == 1)
-            invertBits(out, dstBit, outWidthBits);
-    }
-    return true;
+    // A file whose background is 1 is delivered with background 0.
+    return packedbits::cutBitmap(bytes(m_workBuffer), m_bitmapRowBits, m_bitmapRows, bytes(buffer), x0, y0,
+                                 width, srcRows, outWidthBits, outRows, m_padPixelValue == 1);
 }
 
 // ---- block reading ----------------------------------------------------------------------------------------
