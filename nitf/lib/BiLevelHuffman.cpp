@@ -228,19 +228,22 @@ BiLevelHuffman::Result BiLevelHuffman::decode(const unsigned char* data, size_t 
         static_cast<int>(std::min<uint64_t>(static_cast<uint64_t>(m_width), 8 * uint64_t(size) + 16));
     const size_t stride = static_cast<size_t>(m_capacity) + kEndMarkers;
     m_lines.resize(2 * stride);
-    Line reference{m_lines.data(), 0}, line{m_lines.data() + stride, 0};
+    Line reference{m_lines.data(), 0, 0}, line{m_lines.data() + stride, 0, 0};
     finishLine(reference); // a first line coded two-dimensionally refers to a white line
 
     BitReader in(data, size);
     for (int row = 0; row < rows; ++row) {
-        line.count = 0;
+        line.count = line.end = 0;
         bool oneDimensional = true;
         bool decoded = startLine(in, oneDimensional, result) &&
                        (oneDimensional ? decodeOneDimensional(in, line, result)
                                        : decodeTwoDimensional(in, reference, line, result));
-        if (decoded && in.pastEnd()) {
-            result.damage = eDamageTruncated;
+        if (!decoded || in.pastEnd()) {
+            // Codes completed by bits past the end are made up: the data were cut.
+            if (in.pastEnd())
+                result.damage = eDamageTruncated;
             decoded = false;
+            closeLine(line);
         }
         finishLine(line);
         if (out)
@@ -332,6 +335,7 @@ bool BiLevelHuffman::decodeOneDimensional(BitReader& in, Line& line, Result& res
         position += run;
         if (position < m_width && !pushChange(line, position, result))
             return false;
+        line.end = position;
     }
     return true;
 }
@@ -361,7 +365,7 @@ bool BiLevelHuffman::decodeTwoDimensional(BitReader& in, const Line& reference, 
         in.skip(length);
         const int mode = entry >> 3;
         if (mode == kPassMode) {
-            a0 = b2;
+            a0 = line.end = b2;
             b += 2;
             continue;
         }
@@ -377,6 +381,7 @@ bool BiLevelHuffman::decodeTwoDimensional(BitReader& in, const Line& reference, 
             a0 += second;
             if (a0 < m_width && !pushChange(line, a0, result))
                 return false;
+            line.end = a0;
             continue;
         }
         const int a1 = b1 + mode - kVertical0;
@@ -386,12 +391,20 @@ bool BiLevelHuffman::decodeTwoDimensional(BitReader& in, const Line& reference, 
         }
         if (a1 < m_width && !pushChange(line, a1, result))
             return false;
-        a0 = a1;
+        a0 = line.end = a1;
         black = !black;
         // b1 must now be of the other colour: the candidate before the current one may lie after a1.
         b = b > 0 ? b - 1 : 1;
     }
     return true;
+}
+
+// A damaged line keeps the runs decoded whole: a run whose end was not decoded is left white.
+void BiLevelHuffman::closeLine(Line& line) const {
+    if (line.count % 2 != 0 && line.end < m_width) {
+        Result ignored;
+        pushChange(line, line.end, ignored);
+    }
 }
 
 void BiLevelHuffman::finishLine(Line& line) const {
@@ -408,16 +421,17 @@ void BiLevelHuffman::paint(const Line& line, unsigned char* out, uint64_t rowBit
 }
 
 // Passes over the RTC (six EOLs, each with its tag bit in two-dimensional coding) and the padding to a
-// whole byte. Some files carry a seventh EOL; a further EOL is taken too unless it starts on a whole byte,
-// where the first EOL of a following block would.
+// whole byte. Some files carry a seventh EOL. A following block starts on a whole byte, perhaps with fill:
+// an EOL beyond the sixth is taken only when it cannot be that block's first, that is when fewer than eleven
+// of its 0 bits lie beyond the next whole byte.
 size_t BiLevelHuffman::endOfCoding(BitReader& in, size_t size) const {
     for (int eols = 0;; ++eols) {
         BitReader probe = in;
+        const uint64_t start = probe.position();
         const uint64_t zeros = probe.skipZeros();
         if (zeros < kEolZeros || probe.pastEnd())
             break;
-        const uint64_t eolStart = probe.position() - kEolZeros;
-        if (eols >= 6 && eolStart % 8 == 0)
+        if (eols >= 6 && probe.position() - (start + 7) / 8 * 8 >= kEolZeros)
             break;
         probe.skip(1);
         if (m_twoDimensional)

@@ -75,6 +75,7 @@ private:
     struct Line {
         int* changes; // positions where the colour changes, white to black first, ascending, below the width
         int count;
+        int end; // the pixels before it are decoded
     };
 
     static const int kEndMarkers = 3; // the width, after a line's changes, so b1 and b2 can always be read
@@ -85,6 +86,7 @@ private:
     bool decodeTwoDimensional(BitReader& in, const Line& reference, Line& line, Result& result) const;
     int readRun(BitReader& in, bool black, int room, Result& result) const;
     bool pushChange(Line& line, int position, Result& result) const;
+    void closeLine(Line& line) const;
     void finishLine(Line& line) const;
     void paint(const Line& line, unsigned char* out, uint64_t rowBit) const;
     size_t endOfCoding(BitReader& in, size_t size) const;
