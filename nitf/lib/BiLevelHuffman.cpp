@@ -191,7 +191,8 @@ private:
 // ---- decoding ---------------------------------------------------------------------------------------------
 
 BiLevelHuffman::BiLevelHuffman(int width, bool twoDimensional)
-    : m_width(width), m_twoDimensional(twoDimensional), m_capacity(0) {}
+    : m_width(width), m_twoDimensional(twoDimensional), m_whiteCodes(codeTables().white),
+      m_blackCodes(codeTables().black), m_modeCodes(codeTables().mode), m_capacity(0) {}
 
 const char* BiLevelHuffman::describe(eDamage_t damage) {
     switch (damage) {
@@ -211,7 +212,7 @@ const char* BiLevelHuffman::describe(eDamage_t damage) {
     return "unknown damage";
 }
 
-BiLevelHuffman::eDamage_t BiLevelHuffman::invalidCode(const BitReader& in) {
+inline BiLevelHuffman::eDamage_t BiLevelHuffman::invalidCode(const BitReader& in) {
     // The longest code word is 13 bits: with fewer left, the data ended inside one.
     if (in.bitsLeft() < 13)
         return eDamageTruncated;
@@ -265,7 +266,7 @@ BiLevelHuffman::Result BiLevelHuffman::decode(const unsigned char* data, size_t 
 
 // Reads the EOL (after any fill) that introduces a line, and its tag bit; EOLs that follow at once (a
 // repeated EOL, a spare one between blocks) are passed over.
-bool BiLevelHuffman::startLine(BitReader& in, bool& oneDimensional, Result& result) const {
+inline bool BiLevelHuffman::startLine(BitReader& in, bool& oneDimensional, Result& result) const {
     for (;;) {
         const uint64_t zeros = in.skipZeros();
         if (in.pastEnd()) {
@@ -285,9 +286,8 @@ bool BiLevelHuffman::startLine(BitReader& in, bool& oneDimensional, Result& resu
 }
 
 // One run: make-up codes, then one terminating code. -1 when the run is damaged or longer than `room`.
-int BiLevelHuffman::readRun(BitReader& in, bool black, int room, Result& result) const {
-    const CodeTables& tables = codeTables();
-    const uint16_t* table = black ? tables.black : tables.white;
+inline int BiLevelHuffman::readRun(BitReader& in, bool black, int room, Result& result) const {
+    const uint16_t* table = black ? m_blackCodes : m_whiteCodes;
     const int indexBits = black ? kBlackBits : kWhiteBits;
     int run = 0;
     for (;;) {
@@ -312,7 +312,7 @@ int BiLevelHuffman::readRun(BitReader& in, bool black, int room, Result& result)
 
 // Records a colour change at `position` (below the width, not before the last change). A change at the
 // position of the last one undoes it: the run between them is empty.
-bool BiLevelHuffman::pushChange(Line& line, int position, Result& result) const {
+inline bool BiLevelHuffman::pushChange(Line& line, int position, Result& result) const {
     if (line.count > 0 && line.changes[line.count - 1] == position) {
         --line.count;
         return true;
@@ -326,7 +326,7 @@ bool BiLevelHuffman::pushChange(Line& line, int position, Result& result) const 
 }
 
 // Runs of alternating colour, white first, that add up to the width.
-bool BiLevelHuffman::decodeOneDimensional(BitReader& in, Line& line, Result& result) const {
+inline bool BiLevelHuffman::decodeOneDimensional(BitReader& in, Line& line, Result& result) const {
     bool black = false;
     for (int position = 0; position < m_width; black = !black) {
         const int run = readRun(in, black, m_width - position, result);
@@ -343,9 +343,8 @@ bool BiLevelHuffman::decodeOneDimensional(BitReader& in, Line& line, Result& res
 // Changes coded against the reference line. a0 is the position reached (-1 before the line's first pixel),
 // `black` its colour; b indexes b1, the reference's first change after a0 to the other colour: changes at
 // even indexes turn black, so b's parity follows a0's colour.
-bool BiLevelHuffman::decodeTwoDimensional(BitReader& in, const Line& reference, Line& line,
-                                          Result& result) const {
-    const uint8_t* modes = codeTables().mode;
+inline bool BiLevelHuffman::decodeTwoDimensional(BitReader& in, const Line& reference, Line& line,
+                                                 Result& result) const {
     const int* changes = reference.changes;
     int a0 = -1;
     bool black = false;
@@ -356,7 +355,7 @@ bool BiLevelHuffman::decodeTwoDimensional(BitReader& in, const Line& reference, 
             b += 2;
         const int b1 = changes[b], b2 = changes[b + 1];
         in.ensure(kModeBits);
-        const uint8_t entry = modes[in.peek(kModeBits)];
+        const uint8_t entry = m_modeCodes[in.peek(kModeBits)];
         const int length = entry & 7;
         if (length == 0) {
             result.damage = invalidCode(in);
@@ -400,20 +399,20 @@ bool BiLevelHuffman::decodeTwoDimensional(BitReader& in, const Line& reference, 
 }
 
 // A damaged line keeps the runs decoded whole: a run whose end was not decoded is left white.
-void BiLevelHuffman::closeLine(Line& line) const {
+inline void BiLevelHuffman::closeLine(Line& line) const {
     if (line.count % 2 != 0 && line.end < m_width) {
         Result ignored;
         pushChange(line, line.end, ignored);
     }
 }
 
-void BiLevelHuffman::finishLine(Line& line) const {
+inline void BiLevelHuffman::finishLine(Line& line) const {
     for (int i = 0; i < kEndMarkers; ++i)
         line.changes[line.count + i] = m_width;
 }
 
 // Clears the row, then sets its black runs (from each even-indexed change to the next change).
-void BiLevelHuffman::paint(const Line& line, unsigned char* out, uint64_t rowBit) const {
+inline void BiLevelHuffman::paint(const Line& line, unsigned char* out, uint64_t rowBit) const {
     packedbits::setBits(out, rowBit, static_cast<uint64_t>(m_width), false);
     for (int i = 0; i < line.count; i += 2)
         packedbits::setBits(out, rowBit + line.changes[i],

@@ -80,19 +80,23 @@ private:
 
     static const int kEndMarkers = 3; // the width, after a line's changes, so b1 and b2 can always be read
 
-    static eDamage_t invalidCode(const BitReader& in);
-    bool startLine(BitReader& in, bool& oneDimensional, Result& result) const;
-    bool decodeOneDimensional(BitReader& in, Line& line, Result& result) const;
-    bool decodeTwoDimensional(BitReader& in, const Line& reference, Line& line, Result& result) const;
-    int readRun(BitReader& in, bool black, int room, Result& result) const;
-    bool pushChange(Line& line, int position, Result& result) const;
-    void closeLine(Line& line) const;
-    void finishLine(Line& line) const;
-    void paint(const Line& line, unsigned char* out, uint64_t rowBit) const;
+    // The line decoding runs for every run of every line: inline, so calls stay inside the library.
+    static inline eDamage_t invalidCode(const BitReader& in);
+    inline bool startLine(BitReader& in, bool& oneDimensional, Result& result) const;
+    inline bool decodeOneDimensional(BitReader& in, Line& line, Result& result) const;
+    inline bool decodeTwoDimensional(BitReader& in, const Line& reference, Line& line, Result& result) const;
+    inline int readRun(BitReader& in, bool black, int room, Result& result) const;
+    inline bool pushChange(Line& line, int position, Result& result) const;
+    inline void closeLine(Line& line) const;
+    inline void finishLine(Line& line) const;
+    inline void paint(const Line& line, unsigned char* out, uint64_t rowBit) const;
     size_t endOfCoding(BitReader& in, size_t size) const;
 
     int m_width;
     bool m_twoDimensional;
+    const uint16_t* m_whiteCodes; // the code word look-up tables
+    const uint16_t* m_blackCodes;
+    const uint8_t* m_modeCodes;
     int m_capacity;           // changing positions a line can hold in the current block
     std::vector<int> m_lines; // two lines of changing positions, each with room for end markers
 };

@@ -45,8 +45,10 @@ inline void copyBits(unsigned char* dst, uint64_t dstBit, const unsigned char* s
 }
 
 // Sets (or clears) `count` bits from `bit` on, leaving the bits around them alone: the partial bytes at the
-// ends through masks, the whole bytes between them with one memset.
-inline void setBits(unsigned char* data, uint64_t bit, uint64_t count, bool value) {
+// ends through masks, the whole bytes between them with one memset. Decoders call it for every run: forced
+// inline, so the call does not go through the shared library's symbol table.
+__attribute__((always_inline)) inline void setBits(unsigned char* data, uint64_t bit, uint64_t count,
+                                                   bool value) {
     if (count == 0)
         return;
     const uint64_t first = bit >> 3, last = (bit + count - 1) >> 3;
