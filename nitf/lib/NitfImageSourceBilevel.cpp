@@ -130,8 +130,9 @@ void CNitfImageSourceBilevel::buildBitmap(FILE* fp) {
         NITF_RAISE_FORMAT(signature, "A bi-level image of %lld x %lld pixels is too large", rowBits, rows);
     const long long size = bits / 8 + 1;
     const long long codedLines = 8 * static_cast<long long>(m_dataEnd - m_dataOffset) / kLeastLineBits;
-    const long long fillable = codedLines * width / 8 + kBitmapSlack;
-    if (size > fillable)
+    long long fillable = 0;
+    if (!__builtin_mul_overflow(codedLines, static_cast<long long>(width), &fillable) &&
+        fillable / 8 + kBitmapSlack < size)
         NITF_RAISE_FORMAT(
             signature, "The image's bitmap (%lld bytes) is larger than its coded data (%lld bytes) can fill",
             size, static_cast<long long>(m_dataEnd - m_dataOffset));
