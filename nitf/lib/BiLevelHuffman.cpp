@@ -139,7 +139,7 @@ public:
             m_count |= 56;
             return;
         }
-        for (; m_count <= 56; m_count += 8, ++m_next)
+        for (; m_count < 56; m_count += 8, ++m_next)
             m_window |= static_cast<uint64_t>(m_next < m_size ? m_data[m_next] : 0) << (56 - m_count);
     }
     void ensure(int bits) {
