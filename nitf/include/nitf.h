@@ -49,6 +49,7 @@
 #include "NitfHeaderDataPair.h"
 #include "NitfImagePropertiesIF.h"
 #include "NitfImageSource.h"
+#include "NitfImageSourceBilevel.h"
 #include "NitfImageSourceJpeg.h"
 #include "NitfImageSourceJpeg2000.h"
 #include "NitfImageSourceUncompressed.h"

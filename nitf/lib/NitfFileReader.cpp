@@ -11,6 +11,7 @@
 #include "NitfFileHeaderV21.h"
 #include "NitfImageSource.h"
 #include "NitfImagePropertiesIF.h"
+#include "NitfImageSourceBilevel.h"
 #include "NitfImageSourceJpeg.h"
 #include "NitfImageSourceJpeg2000.h"
 #include "NitfImageSourceUncompressed.h"
@@ -224,6 +225,9 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
         case CNitfImagePropertiesIF::eCompressionUncompressed:
             source = new CNitfImageSourceUncompressed(subheader, nullptr);
             break;
+        case CNitfImagePropertiesIF::eCompressionBilevel:
+            source = new CNitfImageSourceBilevel(subheader, nullptr);
+            break;
         case CNitfImagePropertiesIF::eCompressionJpeg:
         case CNitfImagePropertiesIF::eCompressionJpegLossless:
         case CNitfImagePropertiesIF::eCompressionDownsampledJpeg:
@@ -244,7 +248,7 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
             NITF_RAISE_FORMAT(kImageSourceSignature, "Unsupported compression type (ISH.IC == M%d/C%d)",
                               static_cast<int>(code->type), static_cast<int>(code->type));
         default:
-            // Decoders that have not landed yet: bi-level and VQ.
+            // Decoders that have not landed yet: VQ.
             NITF_RAISE_FORMAT(kImageSourceSignature,
                               "Compression not yet supported by this build (ISH.IC == %s)",
                               nitf_detail::printable(ic).c_str());

@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <climits>
-#include <cmath>
 #include <cstdint>
 #include <cstring>
 
@@ -14,6 +13,8 @@
 #include "Raise.h"
 
 static const char kSourceFile[] = "nitf/lib/NitfImageSourceUncompressed";
+
+using packedbits::copyBits;
 
 namespace {
 
@@ -229,28 +230,9 @@ char* CNitfImageSourceUncompressed::ReassemblingBitmap(const char* data, long lo
 
 bool CNitfImageSourceUncompressed::readBitmap(char* buffer, int x0, int y0, int width, int srcRows,
                                               int outWidthBits, int outRows) {
-    if (!m_workBuffer || !buffer || x0 < 0 || y0 < 0 || width < 0 || outWidthBits < width || outRows < 0 ||
-        x0 + static_cast<long long>(width) > m_bitmapRowBits)
-        return false;
-    // Nearest-lower row sampling; columns are not resampled.
-    const double ratio = outRows > 0 ? static_cast<double>(srcRows) / outRows : 0.0;
-    auto sourceRow = [&](int i) { return static_cast<long long>(std::floor(i * ratio)) + y0; };
-    if (outRows > 0) {
-        const long long first = sourceRow(0), last = sourceRow(outRows - 1);
-        if (std::min(first, last) < 0 || std::max(first, last) >= m_bitmapRows)
-            return false;
-    }
-    unsigned char* out = bytes(buffer);
-    const unsigned char* bitmap = bytes(m_workBuffer);
-    for (int i = 0; i < outRows; ++i) {
-        const long long dstBit = static_cast<long long>(i) * outWidthBits;
-        copyBits(out, dstBit, bitmap, sourceRow(i) * m_bitmapRowBits + x0, width);
-        setBits(out, dstBit + width, outWidthBits - width, false);
-        // A file whose background is 1 is delivered with background 0.
-        if (m_padPixelValue == 1)
-            invertBits(out, dstBit, outWidthBits);
-    }
-    return true;
+    // A file whose background is 1 is delivered with background 0.
+    return packedbits::cutBitmap(bytes(m_workBuffer), m_bitmapRowBits, m_bitmapRows, bytes(buffer), x0, y0,
+                                 width, srcRows, outWidthBits, outRows, m_padPixelValue == 1);
 }
 
 // ---- block reading ----------------------------------------------------------------------------------------

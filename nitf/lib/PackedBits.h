@@ -1,7 +1,10 @@
-// Bit streams, most significant bit first: how samples of depths that are not whole bytes (1, 4, 12, ...)
-// are stored, and how bi-level images are delivered.
+// Bit ranges of most-significant-bit-first bit streams: the packed samples of depths that are not whole
+// bytes, and the image-wide bitmaps of bi-level images, which the uncompressed and the bi-level sources
+// share.
 #pragma once
 
+#include <algorithm>
+#include <cmath>
 #include <cstdint>
 #include <cstring>
 
@@ -41,13 +44,29 @@ inline void copyBits(unsigned char* dst, uint64_t dstBit, const unsigned char* s
         putBit(dst, dstBit++, getBit(src, srcBit++));
 }
 
-inline void setBits(unsigned char* data, uint64_t bit, uint64_t count, bool value) {
-    for (; count > 0 && (bit & 7) != 0; --count)
-        putBit(data, bit++, value);
-    std::memset(data + (bit >> 3), value ? 0xFF : 0, count >> 3);
-    bit += count & ~uint64_t(7);
-    for (count &= 7; count > 0; --count)
-        putBit(data, bit++, value);
+// Sets (or clears) `count` bits from `bit` on, leaving the bits around them alone: the partial bytes at the
+// ends through masks, the whole bytes between them with one memset. Decoders call it for every run: forced
+// inline, so the call does not go through the shared library's symbol table.
+__attribute__((always_inline)) inline void setBits(unsigned char* data, uint64_t bit, uint64_t count,
+                                                   bool value) {
+    if (count == 0)
+        return;
+    const uint64_t first = bit >> 3, last = (bit + count - 1) >> 3;
+    const unsigned char head = static_cast<unsigned char>(0xFF >> (bit & 7));
+    const unsigned char tail = static_cast<unsigned char>(0xFF << (7 - ((bit + count - 1) & 7)));
+    auto apply = [&](uint64_t index, unsigned char mask) {
+        if (value)
+            data[index] |= mask;
+        else
+            data[index] &= static_cast<unsigned char>(~mask);
+    };
+    if (first == last) {
+        apply(first, head & tail);
+        return;
+    }
+    apply(first, head);
+    std::memset(data + first + 1, value ? 0xFF : 0, last - first - 1);
+    apply(last, tail);
 }
 
 inline void invertBits(unsigned char* data, uint64_t bit, uint64_t count) {
@@ -76,6 +95,32 @@ inline unsigned char* bytes(char* data) {
 }
 inline const unsigned char* bytes(const char* data) {
     return reinterpret_cast<const unsigned char*>(data);
+}
+
+// Cuts a region out of an image-wide bitmap of `rowBits` x `rows` bits into `buffer`, output row i at bit
+// i x outWidthBits: `width` bits from column x0 of source row floor(i x srcRows / outRows) + y0
+// (nearest-lower row sampling; columns are not resampled), the rest of the output row cleared; with `invert`
+// every output bit is inverted. False, with nothing written, when the region is not inside the bitmap.
+inline bool cutBitmap(const unsigned char* bitmap, long long rowBits, long long rows, unsigned char* buffer,
+                      int x0, int y0, int width, int srcRows, int outWidthBits, int outRows, bool invert) {
+    if (!bitmap || !buffer || x0 < 0 || y0 < 0 || width < 0 || outWidthBits < width || outRows < 0 ||
+        x0 + static_cast<long long>(width) > rowBits)
+        return false;
+    const double ratio = outRows > 0 ? static_cast<double>(srcRows) / outRows : 0.0;
+    auto sourceRow = [&](int i) { return static_cast<long long>(std::floor(i * ratio)) + y0; };
+    if (outRows > 0) {
+        const long long firstRow = sourceRow(0), lastRow = sourceRow(outRows - 1);
+        if (std::min(firstRow, lastRow) < 0 || std::max(firstRow, lastRow) >= rows)
+            return false;
+    }
+    for (int i = 0; i < outRows; ++i) {
+        const uint64_t dstBit = static_cast<uint64_t>(i) * outWidthBits;
+        copyBits(buffer, dstBit, bitmap, sourceRow(i) * rowBits + x0, width);
+        setBits(buffer, dstBit + width, outWidthBits - width, false);
+        if (invert)
+            invertBits(buffer, dstBit, outWidthBits);
+    }
+    return true;
 }
 
 } // namespace packedbits
