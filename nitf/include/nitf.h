@@ -51,6 +51,7 @@
 #include "NitfImageSource.h"
 #include "NitfImageSourceJpeg.h"
 #include "NitfImageSourceUncompressed.h"
+#include "NitfImageSourceVQ.h"
 #include "NitfImageSubheader.h"
 #include "NitfImageSubheaderV10.h"
 #include "NitfImageSubheaderV20.h"

@@ -13,6 +13,7 @@
 #include "NitfImagePropertiesIF.h"
 #include "NitfImageSourceJpeg.h"
 #include "NitfImageSourceUncompressed.h"
+#include "NitfImageSourceVQ.h"
 #include "NitfImageSubheader.h"
 #include "NitfLabelSource.h"
 #include "NitfSymbolSource.h"
@@ -216,6 +217,9 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
         case CNitfImagePropertiesIF::eCompressionDownsampledJpeg:
             source = new CNitfImageSourceJpeg(subheader, nullptr);
             break;
+        case CNitfImagePropertiesIF::eCompressionVQ:
+            source = new CNitfImageSourceVQ(subheader, nullptr);
+            break;
         case CNitfImagePropertiesIF::eCompressionAridPcm:
             NITF_RAISE("AridPcm compression not supported (ISH.IC == M2/C2)", kImageSourceSignature);
         case CNitfImagePropertiesIF::eCompressionCorrelated:
@@ -228,7 +232,7 @@ CNitfImageSource* CNitfFileReader::getNewImageSource(int index) {
             NITF_RAISE_FORMAT(kImageSourceSignature, "Unsupported compression type (ISH.IC == M%d/C%d)",
                               static_cast<int>(code->type), static_cast<int>(code->type));
         default:
-            // Decoders that have not landed yet: bi-level, VQ and JPEG 2000.
+            // Decoders that have not landed yet: bi-level and JPEG 2000.
             NITF_RAISE_FORMAT(kImageSourceSignature,
                               "Compression not yet supported by this build (ISH.IC == %s)", ic.c_str());
         }
