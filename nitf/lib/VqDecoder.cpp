@@ -3,6 +3,10 @@
 #include <cstdint>
 #include <cstring>
 
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
+
 #include "BitStream.h"
 #include "Raise.h"
 
@@ -81,23 +85,43 @@ void CVqDecoder::copyKernels(unsigned char* out, ptrdiff_t lineBytes) const {
     }
 }
 
-// The CADRG/CIB case: each kernel row is one 32-bit word.
+// The CADRG/CIB case: each kernel row is one 32-bit word. Four codes side by side make a 4 x 4 matrix of
+// words (a kernel per vector, a kernel row per lane): transposed, each vector is 16 bytes of one line.
 void CVqDecoder::copyKernels4x4(unsigned char* out, ptrdiff_t lineBytes) const {
     const unsigned short* code = m_codes.data();
     const unsigned char* kernels = m_kernels.data();
     for (int row = 0; row < m_codeRows; ++row) {
-        unsigned char* line0 = out + static_cast<ptrdiff_t>(row) * 4 * lineBytes;
-        unsigned char* line1 = line0 + lineBytes;
-        unsigned char* line2 = line1 + lineBytes;
-        unsigned char* line3 = line2 + lineBytes;
-        for (int column = 0; column < m_codesPerRow; ++column, ++code) {
+        unsigned char* line[4];
+        line[0] = out + static_cast<ptrdiff_t>(row) * 4 * lineBytes;
+        for (int i = 1; i < 4; ++i)
+            line[i] = line[i - 1] + lineBytes;
+        int column = 0;
+#if defined(__SSE2__)
+        for (; column + 4 <= m_codesPerRow; column += 4, code += 4) {
+            const __m128i a =
+                _mm_loadu_si128(reinterpret_cast<const __m128i*>(kernels + 16 * size_t(code[0])));
+            const __m128i b =
+                _mm_loadu_si128(reinterpret_cast<const __m128i*>(kernels + 16 * size_t(code[1])));
+            const __m128i c =
+                _mm_loadu_si128(reinterpret_cast<const __m128i*>(kernels + 16 * size_t(code[2])));
+            const __m128i d =
+                _mm_loadu_si128(reinterpret_cast<const __m128i*>(kernels + 16 * size_t(code[3])));
+            const __m128i ab01 = _mm_unpacklo_epi32(a, b), cd01 = _mm_unpacklo_epi32(c, d);
+            const __m128i ab23 = _mm_unpackhi_epi32(a, b), cd23 = _mm_unpackhi_epi32(c, d);
+            _mm_storeu_si128(reinterpret_cast<__m128i*>(line[0] + 4 * column),
+                             _mm_unpacklo_epi64(ab01, cd01));
+            _mm_storeu_si128(reinterpret_cast<__m128i*>(line[1] + 4 * column),
+                             _mm_unpackhi_epi64(ab01, cd01));
+            _mm_storeu_si128(reinterpret_cast<__m128i*>(line[2] + 4 * column),
+                             _mm_unpacklo_epi64(ab23, cd23));
+            _mm_storeu_si128(reinterpret_cast<__m128i*>(line[3] + 4 * column),
+                             _mm_unpackhi_epi64(ab23, cd23));
+        }
+#endif
+        for (; column < m_codesPerRow; ++column, ++code) {
             const unsigned char* kernel = kernels + 16 * static_cast<size_t>(*code);
-            uint32_t rows[4];
-            std::memcpy(rows, kernel, 16);
-            std::memcpy(line0 + 4 * column, &rows[0], 4);
-            std::memcpy(line1 + 4 * column, &rows[1], 4);
-            std::memcpy(line2 + 4 * column, &rows[2], 4);
-            std::memcpy(line3 + 4 * column, &rows[3], 4);
+            for (int i = 0; i < 4; ++i)
+                std::memcpy(line[i] + 4 * column, kernel + 4 * i, 4);
         }
     }
 }
