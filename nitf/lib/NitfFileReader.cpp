@@ -1,6 +1,7 @@
 #include "NitfFileReader.h"
 
 #include <cstring>
+#include <memory>
 #include <string>
 
 #include "HostFile.h"
@@ -19,6 +20,7 @@
 #include "NitfSymbolSource.h"
 #include "NitfTextSource.h"
 #include "Raise.h"
+#include "RpfSource.h"
 
 static const char kSourceFile[] = "nitf/lib/NitfFileReader";
 
@@ -268,6 +270,15 @@ CNitfTag* CNitfFileReader::getExtensionTag(const char* name) {
 
 bool CNitfFileReader::hasExtensionRpf() {
     return getExtensionTag("RPFHDR") != nullptr;
+}
+
+CRpfSource* CNitfFileReader::getNewExtensionRpfSource() {
+    CNitfTag* tag = getExtensionTag("RPFHDR");
+    if (!tag)
+        return nullptr;
+    auto source = std::make_unique<CRpfSource>();
+    source->readStart(m_fp, tag);
+    return source.release();
 }
 
 CNitfExtension* CNitfFileReader::getNewExtensionPIAPRD() {
