@@ -76,10 +76,16 @@ public:
     // The 6-character geographic location code of a point: 15-degree cells of longitude and latitude, whole
     // degrees within them (letters without I and O), and tenths of a degree (digits). (0, 0) is "NGAA00".
     static std::string getGeographicLocation(double latitude, double longitude);
+    // Reads the header section alone at `offset`, in the byte order it gives; raises vexo::Exception for an
+    // unknown byte order or a header beyond the end of the file.
+    static void readHeaderSection(FILE* fp, __int64 offset, nitf::CRpfHeaderSection& header);
     // True when the stream starts with the header section of an A.TOC (a raw A.TOC file).
     static bool isRawToc(FILE* fp);
 
 private:
+    // Whether the values of the RPF sections whose header section is at `offset` are byte-reversed from this
+    // host's order (the header's byte order indicator says).
+    static bool swappingAt(FILE* fp, __int64 offset);
     // Bytes the fields produce, measured with a query.
     template <class Fields> static __int64 measure(Fields fields);
     void checkFrameTables() const;

@@ -87,6 +87,7 @@
 #include "RpfBoundaryRectangleRecord.h"
 #include "RpfBoundaryRectangleSection.h"
 #include "RpfComponentLocation.h"
+#include "RpfFrame.h"
 #include "RpfFrameFileIndexRecord.h"
 #include "RpfFrameFileIndexSection.h"
 #include "RpfHeaderSection.h"

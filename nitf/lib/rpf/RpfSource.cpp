@@ -78,15 +78,24 @@ void CRpfSource::readStart(FILE* fp, CNitfTag* tag) {
     readStartAt(fp, tag->getDataOffset());
 }
 
-void CRpfSource::readStartAt(FILE* fp, __int64 headerOffset) {
-    static const char signature[] = "void __cdecl CRpfSource::readStartAt(" NITF_FILE_SIG ",__int64)";
+bool CRpfSource::swappingAt(FILE* fp, __int64 offset) {
+    static const char signature[] = "bool __cdecl CRpfSource::swappingAt(" NITF_FILE_SIG ",__int64)";
     unsigned char byteOrder = 0;
-    if (!fp || DKFSeek64(fp, headerOffset, SEEK_SET) != 0 || DKFRead(&byteOrder, 1, 1, fp) != 1)
-        NITF_RAISE_FORMAT(signature, "The RPF header section at byte %lld cannot be read", headerOffset);
+    if (!fp || DKFSeek64(fp, offset, SEEK_SET) != 0 || DKFRead(&byteOrder, 1, 1, fp) != 1)
+        NITF_RAISE_FORMAT(signature, "The RPF header section at byte %lld cannot be read", offset);
     if (byteOrder != kBigEndian && byteOrder != kLittleEndian)
         NITF_RAISE_FORMAT(signature, "Unknown RPF byte order indicator 0x%02X", byteOrder);
-    const bool swapping = (byteOrder == kBigEndian) == hostIsLittleEndian();
-    nitf::CSerializerFileRaw in(fp, swapping);
+    return (byteOrder == kBigEndian) == hostIsLittleEndian();
+}
+
+void CRpfSource::readHeaderSection(FILE* fp, __int64 offset, nitf::CRpfHeaderSection& header) {
+    nitf::CSerializerFileRaw in(fp, swappingAt(fp, offset));
+    in.seek(offset);
+    in >> header;
+}
+
+void CRpfSource::readStartAt(FILE* fp, __int64 headerOffset) {
+    nitf::CSerializerFileRaw in(fp, swappingAt(fp, headerOffset));
     in.seek(headerOffset);
     m_toc = CRpfToc();
     in >> m_toc;
