@@ -14,79 +14,12 @@
 #include "NitfSampleWriter.h"
 #include "NitfTag.h"
 #include "RpfSource.h"
+#include "RpfTables.h"
 #include "SerializerFileRaw.h"
 #include "SerializerQuery.h"
 #include "TestFiles.h"
 
 namespace {
-
-// A description with its frame paths ("" for no frame); the frame table points into `paths`.
-struct Rectangle {
-    RPFBoundaryRectangle_t description{};
-    std::vector<std::string> paths;
-    std::vector<char*> table;
-
-    Rectangle(const char* product, const char* scale, char zone, unsigned rows, unsigned columns,
-              double southLatitude, double westLongitude, double frameDegrees,
-              std::vector<std::string> frames)
-        : paths(std::move(frames)) {
-        std::strcpy(description.productDataType, product);
-        std::strcpy(description.compressionRatio, "55:1");
-        std::strcpy(description.scale, scale);
-        description.zone = zone;
-        std::strcpy(description.producer, "DMAAC");
-        const double north = southLatitude + rows * frameDegrees,
-                     east = westLongitude + columns * frameDegrees;
-        description.upperLeftLatitude = north;
-        description.upperLeftLongitude = westLongitude;
-        description.lowerLeftLatitude = southLatitude;
-        description.lowerLeftLongitude = westLongitude;
-        description.upperRightLatitude = north;
-        description.upperRightLongitude = east;
-        description.lowerRightLatitude = southLatitude;
-        description.lowerRightLongitude = east;
-        description.verticalInterval = frameDegrees;
-        description.horizontalInterval = frameDegrees * 1.25;
-        description.verticalFrames = rows;
-        description.horizontalFrames = columns;
-        for (std::string& path : paths)
-            table.push_back(path.empty() ? nullptr : &path[0]);
-        description.frameCount = static_cast<int>(table.size());
-        description.frameFiles = table.data();
-    }
-};
-
-// Two rectangles: 3 x 2 frames in two directories with one place empty, and one frame at (0, 0).
-std::vector<std::unique_ptr<Rectangle>> knownRectangles() {
-    std::vector<std::unique_ptr<Rectangle>> rectangles;
-    rectangles.push_back(std::make_unique<Rectangle>(
-        "CADRG", "1:1,000,000", '1', 3, 2, 28.0, -100.0, 2.0,
-        std::vector<std::string>{"./RPF/ONC/001ZC013.ON1", "./RPF/ONC/001ZD013.ON1", "./RPF/TPC/001ZE013.ON1",
-                                 "", "./RPF/ONC/001ZF013.ON1", "./RPF/TPC/001ZG013.ON1"}));
-    rectangles.push_back(std::make_unique<Rectangle>("CIB", "10M", '2', 1, 1, 0.0, 0.0, 0.1,
-                                                     std::vector<std::string>{"./001ALL26.I12"}));
-    return rectangles;
-}
-
-CRpfSource builtToc(const std::vector<std::unique_ptr<Rectangle>>& rectangles, long long header,
-                    long long location) {
-    CRpfSource toc;
-    toc.writeStart();
-    for (const auto& rectangle : rectangles)
-        toc.writeAddBoundaryRectangle(rectangle->description);
-    toc.writePrepareHeaders(header, location);
-    return toc;
-}
-
-// The table written as a raw A.TOC file: the header section first, the location section after it.
-std::string rawToc(const std::vector<std::unique_ptr<Rectangle>>& rectangles) {
-    CRpfSource toc = builtToc(rectangles, 0, 48);
-    TempFile file;
-    FILE* fp = std::fopen(file.path().c_str(), "w+b");
-    toc.writeFinish(fp);
-    std::fclose(fp);
-    return file.read();
-}
 
 // readStart on the bytes of a raw A.TOC; the message of its exception, or "".
 std::string readRaw(const std::string& bytes, CRpfSource* into = nullptr) {
@@ -129,7 +62,7 @@ void expectSameDescription(const RPFBoundaryRectangle_t& read, const RPFBoundary
     }
 }
 
-void expectBoundaries(CRpfSource& toc, const std::vector<std::unique_ptr<Rectangle>>& rectangles) {
+void expectBoundaries(CRpfSource& toc, const RpfTestRectangles& rectangles) {
     RPFBoundaryRectangle_t** boundaries = toc.readRpfBoundaries(nullptr);
     size_t count = 0;
     while (boundaries[count])
@@ -187,10 +120,10 @@ TEST(RpfToc, RecordsMeasureTheirFileLengths) {
 
 TEST(RpfToc, OneFrameTableHasThePublishedLayout) {
     // One rectangle of one frame beside the A.TOC: 292 bytes, each component where the format puts it.
-    std::vector<std::unique_ptr<Rectangle>> rectangles;
-    rectangles.push_back(std::make_unique<Rectangle>("CADRG", "1:1M", '1', 1, 1, 33.93, 1.99994, 2.07,
-                                                     std::vector<std::string>{"RPFTOC01.ON2"}));
-    CRpfSource toc = builtToc(rectangles, 0, 48);
+    RpfTestRectangles rectangles;
+    rectangles.push_back(std::make_unique<RpfTestRectangle>("CADRG", "1:1M", '1', 1, 1, 33.93, 1.99994, 2.07,
+                                                            std::vector<std::string>{"RPFTOC01.ON2"}));
+    CRpfSource toc = builtRpfToc(rectangles, 0, 48);
     EXPECT_EQ(toc.computeTagLength(), 48);
     EXPECT_EQ(toc.computeComponentsLength(), 292 - 48);
     EXPECT_EQ(toc.computeTotalLength(), 292);
@@ -205,7 +138,7 @@ TEST(RpfToc, OneFrameTableHasThePublishedLayout) {
     EXPECT_EQ(location.aggregateLength, 190u);
     EXPECT_EQ(location.sectionLength, 54);
 
-    const std::string bytes = rawToc(rectangles);
+    const std::string bytes = rawRpfToc(rectangles);
     ASSERT_EQ(bytes.size(), 292u);
     EXPECT_EQ(bytes.substr(0, 15), std::string("\0\0\x30       A.TOC", 15));
     EXPECT_EQ(bytes.substr(44, 4), std::string("\0\0\0\x30", 4));
@@ -217,8 +150,8 @@ TEST(RpfToc, OneFrameTableHasThePublishedLayout) {
 }
 
 TEST(RpfToc, RawTableReadsBackToTheSameDescriptions) {
-    const auto rectangles = knownRectangles();
-    const std::string bytes = rawToc(rectangles);
+    const auto rectangles = knownRpfRectangles();
+    const std::string bytes = rawRpfToc(rectangles);
     CRpfSource toc;
     ASSERT_EQ(readRaw(bytes, &toc), "");
     EXPECT_EQ(toc.getBoundaryRectangleCount(), 2);
@@ -250,8 +183,8 @@ TEST(RpfToc, RawTableReadsBackToTheSameDescriptions) {
 }
 
 TEST(RpfToc, LittleEndianTablesAreRead) {
-    const auto rectangles = knownRectangles();
-    CRpfSource built = builtToc(rectangles, 0, 48);
+    const auto rectangles = knownRpfRectangles();
+    CRpfSource built = builtRpfToc(rectangles, 0, 48);
     built.getToc().header.byteOrder = 0xFF;
     TempFile file;
     FILE* fp = std::fopen(file.path().c_str(), "w+b");
@@ -264,35 +197,8 @@ TEST(RpfToc, LittleEndianTablesAreRead) {
 }
 
 TEST(RpfToc, NitfWrappedTableReadsThroughTheFileReader) {
-    // A NITF 2.0 file: the header section in the file header's RPFHDR, the rest in an RPFDES TRE of a
-    // registered extensions DES. The sections are laid out once the file gives their places.
-    const auto rectangles = knownRectangles();
-    CRpfSource sizing = builtToc(rectangles, 0, 0);
-    nitfsample::File file;
-    file.version = "NITF02.00";
-    file.udhd = {{"RPFHDR", std::string(static_cast<size_t>(sizing.computeTagLength()), '\0')}};
-    file.des = {nitfsample::treOverflow(
-        "UDHD", 0, {{"RPFDES", std::string(static_cast<size_t>(sizing.computeComponentsLength()), '\0')}},
-        "NITF02.00")};
-    TempFile nitf(nitfsample::build(file));
-    long long header = 0, body = 0;
-    {
-        CNitfFileReader reader;
-        ASSERT_TRUE(reader.open(nitf.path().c_str()));
-        EXPECT_TRUE(reader.hasExtensionRpf());
-        for (CNitfTag* tag : reader.getFileHeader()->getTaggedRecords())
-            if (std::string(tag->getIdentifier()).rfind("RPFHDR", 0) == 0)
-                header = tag->getDataOffset();
-        // The DES data: "RPFDES", its 5-digit length, then the sections.
-        body = reader.getFileHeader()->getDataExtensionHeaderDataPair(0)->getDataOffset() + 11;
-    }
-    ASSERT_GT(header, 0);
-    ASSERT_GT(body, header);
-    CRpfSource toc = builtToc(rectangles, header, body);
-    FILE* fp = std::fopen(nitf.path().c_str(), "r+b");
-    toc.writeFinish(fp);
-    std::fclose(fp);
-
+    const auto rectangles = knownRpfRectangles();
+    TempFile nitf(nitfWrappedRpfToc(rectangles));
     CNitfFileReader reader;
     ASSERT_TRUE(reader.open(nitf.path().c_str()));
     std::unique_ptr<CRpfSource> read(reader.getNewExtensionRpfSource());
@@ -310,19 +216,19 @@ TEST(RpfToc, NitfWrappedTableReadsThroughTheFileReader) {
 TEST(RpfToc, DescriptionsTheRecordsCannotHoldAreRefused) {
     CRpfSource toc;
     toc.writeStart();
-    Rectangle tooMany("CADRG", "1:1M", '1', 1, 2, 0, 0, 1, {"./A.ON1", "./B.ON1", "./C.ON1"});
+    RpfTestRectangle tooMany("CADRG", "1:1M", '1', 1, 2, 0, 0, 1, {"./A.ON1", "./B.ON1", "./C.ON1"});
     EXPECT_THROW(toc.writeAddBoundaryRectangle(tooMany.description), vexo::Exception);
-    Rectangle longName("CADRG", "1:1M", '1', 1, 1, 0, 0, 1, {"./FRAMENAME.ONC1"});
+    RpfTestRectangle longName("CADRG", "1:1M", '1', 1, 1, 0, 0, 1, {"./FRAMENAME.ONC1"});
     EXPECT_THROW(toc.writeAddBoundaryRectangle(longName.description), vexo::Exception);
-    Rectangle longPath("CADRG", "1:1M", '1', 1, 1, 0, 0, 1, {"./" + std::string(300, 'D') + "/A.ON1"});
+    RpfTestRectangle longPath("CADRG", "1:1M", '1', 1, 1, 0, 0, 1, {"./" + std::string(300, 'D') + "/A.ON1"});
     EXPECT_THROW(toc.writeAddBoundaryRectangle(longPath.description), vexo::Exception);
-    Rectangle noColumns("CADRG", "1:1M", '1', 1, 0, 0, 0, 1, {"./A.ON1"});
+    RpfTestRectangle noColumns("CADRG", "1:1M", '1', 1, 0, 0, 0, 1, {"./A.ON1"});
     EXPECT_THROW(toc.writeAddBoundaryRectangle(noColumns.description), vexo::Exception);
     EXPECT_EQ(toc.getBoundaryRectangleCount(), 0);
 }
 
 TEST(RpfToc, DamagedTablesAreRefusedBeforeTheyAreFollowed) {
-    const std::string good = rawToc(knownRectangles());
+    const std::string good = rawRpfToc(knownRpfRectangles());
     ASSERT_EQ(readRaw(good), "");
     // Places in the written table: location section at 48 with four records; 148 at 102, 149 at 110 (two
     // records), 150 at 374, 151 at 387 (six records, then the pathnames at 387 + 198).
@@ -366,7 +272,7 @@ TEST(RpfToc, DamagedTablesAreRefusedBeforeTheyAreFollowed) {
 }
 
 TEST(RpfToc, TruncatedTablesNeverCrash) {
-    const std::string good = rawToc(knownRectangles());
+    const std::string good = rawRpfToc(knownRpfRectangles());
     int refused = 0;
     int tried = 0;
     // Every cut inside the header and location sections, then every few bytes.
