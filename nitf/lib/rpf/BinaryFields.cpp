@@ -98,15 +98,18 @@ CBinaryFields& CBinaryFields::bytes(void* data, size_t length) {
 }
 
 CBinaryFields& CBinaryFields::text(std::string& text, unsigned length, unsigned shortest, unsigned longest) {
+    static const char signature[] =
+        "class nitf::CBinaryFields &__cdecl nitf::CBinaryFields::text(class std::string "
+        "&,unsigned int,unsigned int,unsigned int)";
     if (reading()) {
         if (length < shortest || length > longest)
-            NITF_RAISE_FORMAT(
-                "class nitf::CBinaryFields &__cdecl nitf::CBinaryFields::text(class std::string &,"
-                "unsigned int,unsigned int,unsigned int)",
-                "The %s at byte %lld has a text of %u bytes (%u to %u are allowed)", m_record, m_position,
-                length, shortest, longest);
+            NITF_RAISE_FORMAT(signature, "The %s at byte %lld has a text of %u bytes (%u to %u are allowed)",
+                              m_record, m_position, length, shortest, longest);
         require(length);
         text.assign(length, '\0');
+    } else if (text.size() != length) {
+        // The length field and the text disagree: the record would not read back.
+        NITF_RAISE_FORMAT(signature, "A text of %zu bytes is given a length of %u", text.size(), length);
     }
     return bytes(&text[0], text.size());
 }
