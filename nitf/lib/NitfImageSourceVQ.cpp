@@ -93,13 +93,13 @@ void CNitfImageSourceVQ::readHeader(FILE* fp) {
     unsigned codeRows = in.readUint32();
     unsigned codesPerRow = in.readUint32();
     int codeBits = in.readByte();
-    unsigned algorithm = in.readUint16();
+    const unsigned algorithm = in.readUint16();
     if (((codeRows != kDefaultCodeGrid && codesPerRow != kDefaultCodeGrid) || codesPerRow == 0) &&
         algorithm != 1) {
         // No image display parameters: the data begin with the algorithm identifier.
         DKFSeek64(fp, start, SEEK_SET);
         codeBits = kDefaultCodeBits;
-        algorithm = in.readUint16();
+        in.readUint16(); // the algorithm identifier
         codeRows = codesPerRow = kDefaultCodeGrid;
     }
     const int width = m_properties.getTileWidth();
