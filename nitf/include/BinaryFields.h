@@ -63,8 +63,8 @@ public:
 
     // Raw bytes, never swapped.
     CBinaryFields& bytes(void* data, size_t length);
-    // A text of `length` bytes (a field before it), which must lie in [shortest, longest]: refused when reading
-    // otherwise. Writing a text whose size is not `length` raises vexo::Exception.
+    // A text of `length` bytes (a field before it), which must lie in [shortest, longest]: refused when
+    // reading otherwise. Writing a text whose size is not `length` raises vexo::Exception.
     CBinaryFields& text(std::string& text, unsigned length, unsigned shortest, unsigned longest);
 
     // A table of `count` records, the first at `at`, each `recordLength` bytes after the previous one. When
