@@ -5,3 +5,4 @@ int runSelfCheck(int argc, char** argv);
 int runInfo(int argc, char** argv);
 int runSample(int argc, char** argv);
 int runExtract(int argc, char** argv);
+int runToc(int argc, char** argv);

@@ -14,6 +14,9 @@ static int usage(FILE* out) {
         "       nitf info [--json] FILE  describe the file's headers, segments and TREs\n"
         "       nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm -o OUT\n"
         "                                decode an image (default 0) to canonical raw bytes or a picture\n"
+        "       nitf toc [--json] PATH   an RPF table of contents (A.TOC, raw or NITF) with its rectangles "
+        "and\n"
+        "                                frames, or the RPF description of a CADRG/CIB frame file\n"
         "       nitf sample OUT.ntf      write a small demo NITF 2.1 file\n"
         "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back\n");
     return out == stdout ? 0 : 2;
@@ -38,6 +41,8 @@ int main(int argc, char** argv) {
             return runSelfCheck(argc - 2, argv + 2);
         if (command == "extract")
             return runExtract(argc - 2, argv + 2);
+        if (command == "toc")
+            return runToc(argc - 2, argv + 2);
     } catch (const vexo::Exception& e) {
         std::fprintf(stderr, "nitf: %s\n", e.what());
         return 1;

@@ -18,6 +18,7 @@ class CNitfLabelSource;
 class CNitfTextSource;
 class CNitfDataExtensionSource;
 class CNitfExtension;
+class CRpfSource;
 
 class CNitfFileReader : public CNitfFile {
 public:
@@ -54,7 +55,11 @@ public:
     CNitfTextSource* getNewTextSource(int index);
     CNitfDataExtensionSource* getNewDataExtensionSource(int index);
 
+    // Whether the file header holds an RPFHDR TRE (a frame file or a NITF-wrapped A.TOC).
     bool hasExtensionRpf();
+    // A new RPF table of contents read from the RPFHDR TRE's header section, or null when there is none.
+    // Raises vexo::Exception for a damaged table.
+    CRpfSource* getNewExtensionRpfSource();
     CNitfExtension* getNewExtensionPIAPRD();
 
     // "<width>x<height> Pixels, <bits> Bits per Pixel" of image `index` into `text`.

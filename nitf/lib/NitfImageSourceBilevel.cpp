@@ -47,7 +47,7 @@ void CNitfImageSourceBilevel::readStart(FILE* fp, long long dataOffset, long lon
     if (mode == CNitfImagePropertiesIF::eInterleavingUnknown) {
         CNitfProperty* field = FindProperty(m_subheader->getProperties(), "IMODE");
         NITF_RAISE_FORMAT(signature, "Unknown interleaving mode (ISH.IMODE == '%s')",
-                          field ? field->toText().c_str() : "");
+                          field ? nitf_detail::printable(field->toText()).c_str() : "");
     }
     // Each coded block holds one band: several bands only make sense one after the other.
     if (m_properties.getBandCount() > 1 && mode != CNitfImagePropertiesIF::eBandSequential)

@@ -43,3 +43,6 @@ std::string corpusRoot();
 
 // The whole contents of a file (empty when it cannot be read).
 std::string readWholeFile(const std::string& path);
+
+// Runs a shell command and returns its standard output; `status` receives its exit status (as from system()).
+std::string runCommand(const std::string& command, int& status);

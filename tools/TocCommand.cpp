@@ -1,0 +1,206 @@
+// nitf toc: the RPF table of contents of an A.TOC file (raw or NITF-wrapped) with its boundary rectangles and
+// their frames, and whether each frame file is there beside it; or the RPF description of a frame file. As
+// text or as one JSON object.
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
+#include <memory>
+#include <nlohmann/json.hpp>
+#include <stdexcept>
+#include <string>
+#include <strings.h>
+#include <vector>
+
+#include "Commands.h"
+#include "HostError.h"
+#include "HostFile.h"
+#include "NitfFileReader.h"
+#include "NitfTag.h"
+#include "RpfFrameDescription.h"
+#include "RpfSource.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+// Closes a stream opened with DKOpen.
+struct StreamCloser {
+    void operator()(FILE* fp) const { DKClose(fp); }
+};
+
+// The file a path relative to `directory` names, each component matched without regard to case when it is not
+// there as written (tables store upper-case names; files on disk are often lower case). Empty when missing.
+std::string findFile(const fs::path& directory, const std::string& relative) {
+    fs::path found = directory;
+    std::error_code error;
+    for (const fs::path& part : fs::path(relative)) {
+        if (part == "." || part.empty())
+            continue;
+        if (fs::exists(found / part, error)) {
+            found /= part;
+            continue;
+        }
+        bool matched = false;
+        for (const fs::directory_entry& entry : fs::directory_iterator(found, error)) {
+            if (strcasecmp(entry.path().filename().c_str(), part.c_str()) == 0) {
+                found = entry.path();
+                matched = true;
+                break;
+            }
+        }
+        if (!matched)
+            return std::string();
+    }
+    return fs::is_regular_file(found, error) ? found.string() : std::string();
+}
+
+struct Description {
+    std::vector<std::string> lines;
+    nlohmann::json json;
+};
+
+Description describeToc(CRpfSource& toc, const std::string& path, const char* form) {
+    Description out;
+    const fs::path directory = fs::path(path).parent_path();
+    const nitf::CRpfHeaderSection& header = toc.getToc().header;
+    out.json["file"] = path;
+    out.json["form"] = form;
+    out.json["header"] = describeRpfHeader(header);
+    out.lines.push_back(path + ": RPF table of contents (" + form + "), " +
+                        nitf::textOf(header.standardNumber) + " " + nitf::textOf(header.standardDate) +
+                        ", classification " + nitf::textOf(header.classification));
+
+    std::unique_ptr<RPFBoundaryRectangle_t*, void (*)(RPFBoundaryRectangle_t**)> boundaries(
+        toc.readRpfBoundaries(nullptr), CRpfSource::freeRpfBoundaries);
+    nlohmann::json rectangles = nlohmann::json::array();
+    int present = 0, listed = 0;
+    for (int n = 0; boundaries.get()[n]; ++n) {
+        const RPFBoundaryRectangle_t& r = *boundaries.get()[n];
+        const RpfCorners corners = {{r.upperLeftLatitude, r.upperLeftLongitude},
+                                    {r.upperRightLatitude, r.upperRightLongitude},
+                                    {r.lowerLeftLatitude, r.lowerLeftLongitude},
+                                    {r.lowerRightLatitude, r.lowerRightLongitude}};
+        nlohmann::json rectangle = {{"index", n},
+                                    {"productDataType", r.productDataType},
+                                    {"compressionRatio", r.compressionRatio},
+                                    {"scale", r.scale},
+                                    {"zone", std::string(1, r.zone)},
+                                    {"producer", r.producer},
+                                    {"corners", describeCorners(corners)},
+                                    {"verticalInterval", r.verticalInterval},
+                                    {"horizontalInterval", r.horizontalInterval},
+                                    {"verticalFrames", r.verticalFrames},
+                                    {"horizontalFrames", r.horizontalFrames}};
+        out.lines.push_back("rectangle " + std::to_string(n) + ": " + r.productDataType + " " +
+                            r.compressionRatio + " scale " + r.scale + ", zone " + std::string(1, r.zone) +
+                            ", producer " + r.producer);
+        for (const std::string& line : describeCornerLines(corners))
+            out.lines.push_back(line);
+        out.lines.push_back(
+            formatText("  frames of   %.9g x %.9g degrees (north-south x east-west), grid of %u rows "
+                       "x %u columns",
+                       r.verticalInterval, r.horizontalInterval, r.verticalFrames, r.horizontalFrames));
+        nlohmann::json frames = nlohmann::json::array();
+        for (int i = 0; i < r.frameCount; ++i) {
+            if (!r.frameFiles[i])
+                continue;
+            // Rows count from the south, as the table stores them.
+            const unsigned row = r.verticalFrames - 1 - static_cast<unsigned>(i) / r.horizontalFrames;
+            const unsigned column = static_cast<unsigned>(i) % r.horizontalFrames;
+            const std::string onDisk = findFile(directory, r.frameFiles[i]);
+            ++listed;
+            present += onDisk.empty() ? 0 : 1;
+            frames.push_back({{"row", row},
+                              {"column", column},
+                              {"path", r.frameFiles[i]},
+                              {"file", onDisk.empty() ? nlohmann::json(nullptr) : nlohmann::json(onDisk)},
+                              {"exists", !onDisk.empty()}});
+            out.lines.push_back(formatText("  row %3u column %3u  %s%s", row, column, r.frameFiles[i],
+                                           onDisk.empty() ? "  (missing)" : ""));
+        }
+        rectangle["frames"] = frames;
+        rectangles.push_back(rectangle);
+    }
+    out.json["rectangles"] = rectangles;
+    out.json["framesListed"] = listed;
+    out.json["framesPresent"] = present;
+    out.lines.push_back(std::to_string(rectangles.size()) + " boundary rectangles, " +
+                        std::to_string(listed) + " frames, " + std::to_string(present) + " of them present");
+    return out;
+}
+
+bool startsWithNitf(const std::string& path) {
+    std::unique_ptr<FILE, StreamCloser> fp(DKOpen(path.c_str(), DK_MODE_READ_BINARY, "rb"));
+    char start[4] = {0};
+    return fp && DKFRead(start, 1, sizeof start, fp.get()) == sizeof start &&
+           (std::memcmp(start, "NITF", 4) == 0 || std::memcmp(start, "NSIF", 4) == 0 ||
+            std::memcmp(start, "OSDE", 4) == 0);
+}
+
+// A NITF file with an RPF header section: a table of contents when the header names one or there is no image,
+// else a frame.
+Description describeNitf(const std::string& path) {
+    CNitfFileReader reader;
+    if (!reader.open(path.c_str()))
+        throw std::runtime_error("cannot open " + path);
+    CNitfTag* tag = CNitfTag::find("RPFHDR", reader.getFileHeader()->getTaggedRecords());
+    if (!tag)
+        throw std::runtime_error(path + " has no RPF header section (RPFHDR)");
+    nitf::CRpfHeaderSection header;
+    CRpfSource::readHeaderSection(reader.getInputStream(), tag->getDataOffset(), header);
+    if (strcasecmp(nitf::textOf(header.fileName).c_str(), "A.TOC") == 0 || reader.getImageCount() == 0) {
+        std::unique_ptr<CRpfSource> toc(reader.getNewExtensionRpfSource());
+        return describeToc(*toc, path, "NITF-wrapped");
+    }
+    RpfFrameDescription frame = describeRpfFrame(reader);
+    Description out;
+    out.json = {{"file", path}, {"frame", frame.json}};
+    out.lines.push_back(path + ":");
+    out.lines.insert(out.lines.end(), frame.lines.begin(), frame.lines.end());
+    return out;
+}
+
+Description describeRaw(const std::string& path) {
+    std::unique_ptr<FILE, StreamCloser> fp(DKOpen(path.c_str(), DK_MODE_READ_BINARY, "rb"));
+    if (!fp)
+        throw std::runtime_error("cannot open " + path);
+    if (!CRpfSource::isRawToc(fp.get()))
+        throw std::runtime_error(path + " is neither an A.TOC nor a NITF frame file");
+    CRpfSource toc;
+    toc.readStartAt(fp.get(), 0);
+    return describeToc(toc, path, "raw");
+}
+
+} // namespace
+
+int runToc(int argc, char** argv) {
+    bool json = false;
+    std::vector<const char*> paths;
+    for (int i = 0; i < argc; ++i) {
+        if (std::strcmp(argv[i], "--json") == 0)
+            json = true;
+        else
+            paths.push_back(argv[i]);
+    }
+    if (paths.size() != 1) {
+        std::fprintf(stderr, "usage: nitf toc [--json] A.TOC|FRAME\n");
+        return 2;
+    }
+    const char* path = paths[0];
+    try {
+        const Description description = startsWithNitf(path) ? describeNitf(path) : describeRaw(path);
+        if (json) {
+            std::printf("%s\n", description.json.dump(2).c_str());
+        } else {
+            for (const std::string& line : description.lines)
+                std::printf("%s\n", line.c_str());
+        }
+    } catch (const vexo::Exception& e) {
+        std::fprintf(stderr, "nitf: %s: %s\n", path, e.what());
+        return 1;
+    } catch (const std::exception& e) {
+        std::fprintf(stderr, "nitf: %s\n", e.what());
+        return 1;
+    }
+    return 0;
+}
