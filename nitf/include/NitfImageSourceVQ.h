@@ -4,7 +4,8 @@
 // selecting a kernel of one-byte pixels.
 //
 // Samples are delivered as single bytes; a buffer for a block holds tile-height rows of the row size given.
-// The colour tables of a frame are the sub-header's look-up tables: this source hands out indexes only.
+// The colour tables of a frame are the sub-header's look-up tables: this source hands out indexes only. The
+// pad pixel is the code that stands for no data: the mask's, or the first code past the colours.
 #pragma once
 
 #include <memory>
@@ -45,6 +46,9 @@ public:
     int getKernelWidth() const { return m_kernelWidth; }
     int getKernelHeight() const { return m_kernelHeight; }
     int getIndexBytesPerBlock() const { return m_indexBytesPerBlock; }
+    // Whether the pad pixel (the code of no data, which absent subframes read as) is the first code past the
+    // colours rather than one the mask stores.
+    bool isPadPixelFromColours() const { return m_padFromColours; }
 
 protected:
     void prepareTileOffsets(FILE* fp, long long dataOffset, long long dataLength, unsigned int* blockMask,
@@ -58,6 +62,7 @@ private:
     // Reads the code grid, the lookup records and the codebook at the stream's position (the data offset).
     void readHeader(FILE* fp);
     void readCodebook(FILE* fp);
+    void takeNoDataFromColours();
 
     std::string m_option;
     int m_codeBitLength;
@@ -69,4 +74,5 @@ private:
     std::unique_ptr<CVqDecoder> m_decoder;
     // One block's indexes and the decoder's padding.
     std::vector<unsigned char> m_indexes;
+    bool m_padFromColours = false;
 };

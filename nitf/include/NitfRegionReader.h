@@ -117,6 +117,9 @@ private:
     // Whether whole samples in the blocks are in another byte order than the output wants.
     bool needsSwap() const;
     static void zero(const Target& target, size_t sampleBytes);
+    // Absent blocks read as the image's pad pixel (as zeros when it has none).
+    void fillAbsent(const Target& target) const;
+    std::vector<unsigned char> padSample() const;
 
     CNitfFile* m_file;
     CNitfImageSource* m_source;

@@ -7,6 +7,7 @@
 #include "DataStreamRead.h"
 #include "HostFile.h"
 #include "NitfFile.h"
+#include "NitfLutSource.h"
 #include "Raise.h"
 #include "VqDecoder.h"
 
@@ -81,6 +82,21 @@ void CNitfImageSourceVQ::readStart(FILE* fp, long long dataOffset, long long dat
     CDataStream::requireReadable(fp, m_indexBytesPerBlock, "The indexes of a VQ block");
     m_indexes.assign(static_cast<size_t>(m_indexBytesPerBlock) + CVqDecoder::kIndexPadding, 0);
     prepareTileOffsets(fp, DKFTell(fp), dataLength, m_blockMask, m_blockMaskCount);
+    takeNoDataFromColours();
+}
+
+// Frames whose mask gives no pad pixel code leave the first code past their colours unused (216 of CADRG and
+// CIB's 256): that code stands for no data, and absent subframes read as it.
+void CNitfImageSourceVQ::takeNoDataFromColours() {
+    m_padFromColours = false;
+    if (m_hasPadPixel || getLutCount() == 0 || !getLutSource(0))
+        return;
+    const int colours = getLutSource(0)->getEntryCount();
+    if (colours <= 0 || colours >= 256)
+        return;
+    m_hasPadPixel = true;
+    m_padPixelValue = colours;
+    m_padFromColours = true;
 }
 
 void CNitfImageSourceVQ::readHeader(FILE* fp) {

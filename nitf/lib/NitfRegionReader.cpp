@@ -272,11 +272,16 @@ void CNitfRegionReader::readReduced(int x, int y, int width, int height, const s
 
 void CNitfRegionReader::readBlockBand(int blockX, int blockY, int band, const Target& target, bool wholeBlock,
                                       Result& result) {
-    if (m_source->isBlockAbsent(blockX, blockY, band)) {
+    // Outside the block grid (blocks that do not cover the image): nothing is stored there.
+    if (!m_source->isValidBlock(blockX, blockY, band)) {
         zero(target, m_sampleBytes);
         ++result.absentBlocks;
         return;
     }
+    // A block the file records as absent is still asked for: uncompressed sources deliver zeros for it, as
+    // their block reads always have; the others say it is absent, and it reads as the pad pixel.
+    if (m_source->isBlockAbsent(blockX, blockY, band))
+        ++result.absentBlocks;
     // Samples that need no conversion but perhaps a byte swap are decoded straight into the output.
     const bool direct = wholeBlock && !m_packed && m_deliveredBytes == m_sampleBytes &&
                         target.pixelStride == static_cast<size_t>(m_sampleBytes) &&
@@ -301,10 +306,8 @@ void CNitfRegionReader::readBlockBand(int blockX, int blockY, int band, const Ta
             if (read)
                 convert(m_block.data(), target);
         }
-        if (!read) {
-            zero(target, m_sampleBytes);
-            ++result.absentBlocks;
-        }
+        if (!read)
+            fillAbsent(target);
         countIncomplete(incomplete, blockX, blockY, band, result);
     } catch (const vexo::Exception& e) {
         zero(target, m_sampleBytes);
@@ -357,6 +360,38 @@ void CNitfRegionReader::zero(const Target& target, size_t sampleBytes) {
         for (int c = 0; c < target.width; ++c)
             std::memset(out + c * target.pixelStride, 0, sampleBytes);
     }
+}
+
+std::vector<unsigned char> CNitfRegionReader::padSample() const {
+    std::vector<unsigned char> sample(static_cast<size_t>(m_sampleBytes), 0);
+    if (!m_source->hasPadPixel())
+        return sample;
+    const long long pad = m_source->getPadPixelValue();
+    uint64_t bits = static_cast<uint64_t>(pad);
+    if (m_type == eFloat32) {
+        const float value = static_cast<float>(pad);
+        uint32_t word;
+        std::memcpy(&word, &value, 4);
+        bits = word;
+    } else if (m_type == eFloat64) {
+        const double value = static_cast<double>(pad);
+        std::memcpy(&bits, &value, 8);
+    } else if (m_type == eComplexFloat32 || m_type == eComplexFloat64) {
+        return sample;
+    }
+    storeValue(sample.data(), bits, m_sampleBytes, m_bigEndianOut || kHostBigEndian);
+    return sample;
+}
+
+void CNitfRegionReader::fillAbsent(const Target& target) const {
+    const std::vector<unsigned char> pad = padSample();
+    if (std::all_of(pad.begin(), pad.end(), [](unsigned char b) { return b == 0; })) {
+        zero(target, m_sampleBytes);
+        return;
+    }
+    for (int r = 0; r < target.height; ++r)
+        for (int c = 0; c < target.width; ++c)
+            std::memcpy(target.out + r * target.rowStride + c * target.pixelStride, pad.data(), pad.size());
 }
 
 void CNitfRegionReader::convert(const unsigned char* block, const Target& target) const {

@@ -6,6 +6,7 @@
 #include "HostError.h"
 #include "NitfFileReader.h"
 #include "NitfImageSource.h"
+#include "NitfImageSourceVQ.h"
 #include "NitfImageSubheader.h"
 #include "NitfLutSource.h"
 #include "NitfTag.h"
@@ -100,7 +101,8 @@ void CRpfFrame::readTransparentCode(CNitfFileReader& reader, int image) {
         std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(image));
         if (source->hasPadPixel() && source->getPadPixelValue() >= 0 && source->getPadPixelValue() < kCodes) {
             m_transparentCode = static_cast<int>(source->getPadPixelValue());
-            m_transparentCodeStored = true;
+            const auto* vq = dynamic_cast<const CNitfImageSourceVQ*>(source.get());
+            m_transparentCodeStored = !vq || !vq->isPadPixelFromColours();
         }
     } catch (const vexo::Exception& e) {
         vexo::nspio::Warning::Warn(e.what(), kSourceFile, __LINE__);
