@@ -465,3 +465,94 @@ TEST(HostProjection, GeoreferenceFromCorners) {
     EXPECT_EQ(ProjSetGeoreferenceFromCorners(&info, broken, y, 10, 10), -1);
     EXPECT_EQ(ProjSetGeoreferenceFromCorners(&info, x, y, 0, 10), -1);
 }
+
+TEST(HostProjection, AffineOnlyForParallelogramsAndPixelPositions) {
+    ProjInfo_t info;
+    InitProjInfo(&info);
+    // 11 x 11 pixels of 10 units: a last corner 4 units (0.4 pixel) off still fits the transform, 6 do not.
+    const double x[4] = {0, 100, 104, 0}, y[4] = {100, 100, 0, 0};
+    ASSERT_EQ(ProjSetGeoreferenceFromCorners(&info, x, y, 11, 11), 0);
+    EXPECT_EQ(info.hasAffine, 1);
+    const double far[4] = {0, 100, 106, 0};
+    ASSERT_EQ(ProjSetGeoreferenceFromCorners(&info, far, y, 11, 11), 0);
+    EXPECT_EQ(info.hasAffine, 0);
+    EXPECT_EQ(info.width, 11);
+
+    // Positions come from the corners, bilinearly: exact at the corners, extrapolated beyond them.
+    double px, py;
+    ASSERT_EQ(ProjPixelToMap(&info, 10, 10, &px, &py), 0);
+    EXPECT_EQ(px, 106);
+    EXPECT_EQ(py, 0);
+    ASSERT_EQ(ProjPixelToMap(&info, 5, 5, &px, &py), 0);
+    EXPECT_DOUBLE_EQ(px, 51.5);
+    EXPECT_DOUBLE_EQ(py, 50);
+    ASSERT_EQ(ProjPixelToMap(&info, 20, 0, &px, &py), 0);
+    EXPECT_DOUBLE_EQ(px, 200);
+
+    // A record given only a transform uses it.
+    ProjInfo_t affine;
+    InitProjInfo(&affine);
+    EXPECT_EQ(ProjPixelToMap(&affine, 0, 0, &px, &py), -1);
+    affine.hasAffine = 1;
+    const double a[6] = {1, 2, 3, 4, 5, 6};
+    std::copy(a, a + 6, affine.affine);
+    ASSERT_EQ(ProjPixelToMap(&affine, 10, 100, &px, &py), 0);
+    EXPECT_EQ(px, 1 + 20 + 300);
+    EXPECT_EQ(py, 4 + 50 + 600);
+}
+
+TEST(HostProjection, UtmGeocentricAndGeosysRoundTrips) {
+    ProjInfo_t utm;
+    InitProjInfo(&utm);
+    ASSERT_EQ(DecodeGeosys(&utm, "UTM 17N"), 0);
+    char text[16];
+    ASSERT_EQ(EncodeGeosys(&utm, text, sizeof text), 0);
+    EXPECT_STREQ(text, "UTM 17N");
+    EXPECT_EQ(EncodeGeosys(&utm, text, 4), -1) << "does not fit";
+
+    // The published worked example, and back, to well under a millimetre.
+    double latitude, longitude, x, y;
+    ASSERT_EQ(ProjToGeocoded(&utm, 233085, 3807070, &latitude, &longitude), 0);
+    EXPECT_NEAR(latitude, 34.370624, 1e-6);
+    EXPECT_NEAR(longitude, -83.902537, 1e-6);
+    ASSERT_EQ(GeocodedToProj(&utm, latitude, longitude, &x, &y), 0);
+    EXPECT_NEAR(x, 233085, 1e-6);
+    EXPECT_NEAR(y, 3807070, 1e-6);
+    // A point south of the equator in a northern record has a negative northing, and comes back.
+    ASSERT_EQ(GeocodedToProj(&utm, -0.5, -81, &x, &y), 0);
+    EXPECT_LT(y, 0);
+    ASSERT_EQ(ProjToGeocoded(&utm, x, y, &latitude, &longitude), 0);
+    EXPECT_NEAR(latitude, -0.5, 1e-9);
+    ProjInfo_t south;
+    InitProjInfo(&south);
+    ASSERT_EQ(DecodeGeosys(&south, "UTM 32S"), 0);
+    ASSERT_EQ(ProjToGeocoded(&south, 793327, 8155361, &latitude, &longitude), 0);
+    EXPECT_NEAR(latitude, -16.666110, 1e-6);
+    EXPECT_NEAR(longitude, 11.750000, 1e-6);
+
+    // Geocentric latitude: 32°59' is geodetic 33°09'33.5"; the equator and the poles stay.
+    ProjInfo_t geocentric;
+    InitProjInfo(&geocentric);
+    ASSERT_EQ(DecodeGeosys(&geocentric, "GEOCENTRIC"), 0);
+    ASSERT_EQ(ProjToGeocoded(&geocentric, 85, 32 + 59 / 60.0, &latitude, &longitude), 0);
+    EXPECT_NEAR(latitude, 33 + 9 / 60.0 + 33.5 / 3600, 0.05 / 3600);
+    ASSERT_EQ(GeocodedToProj(&geocentric, latitude, longitude, &x, &y), 0);
+    EXPECT_NEAR(y, 32 + 59 / 60.0, 1e-12);
+    for (double pole : {-90.0, 0.0, 90.0}) {
+        ASSERT_EQ(ProjToGeocoded(&geocentric, 0, pole, &latitude, &longitude), 0);
+        EXPECT_EQ(latitude, pole);
+    }
+
+    ProjInfo_t other = utm;
+    other.earthModel = EARTH_UNKNOWN;
+    EXPECT_EQ(ProjToGeocoded(&other, 233085, 3807070, &latitude, &longitude), -1);
+    ProjInfo_t none;
+    InitProjInfo(&none);
+    EXPECT_EQ(ProjToGeocoded(&none, 0, 0, &latitude, &longitude), -1);
+    EXPECT_EQ(EncodeGeosys(&none, text, sizeof text), -1);
+    ProjInfo_t geographic;
+    InitProjInfo(&geographic);
+    DecodeGeosys(&geographic, "GEO");
+    EXPECT_EQ(ProjToGeocoded(&geographic, 0, 91, &latitude, &longitude), -1);
+    EXPECT_EQ(GeocodedToProj(&utm, 45, NAN, &x, &y), -1);
+}

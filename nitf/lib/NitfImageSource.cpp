@@ -141,12 +141,19 @@ void CNitfImageSource::writeStart(FILE*, long long, long long) {
     allocateTileOffsets();
 }
 
-// The georeferencing bridge. The sub-header's CNitfGeorefInfo will read the corners into the host record with
-// the actual image size (NCOLS x NROWS) and write them with the block-padded size (NBPR x NPPBH, NBPC x
-// NPPBV); until it can, the record is left as it is and nothing is written.
-void CNitfImageSource::readProjection(FILE*, ProjInfo_t*, bool) {}
+// The georeferencing bridge: corners are read for the actual image (NCOLS x NROWS) and written for the
+// block-padded one (NBPR x NPPBH, NBPC x NPPBV). The asymmetry is deliberate and kept.
+void CNitfImageSource::readProjection(FILE* fp, ProjInfo_t* info, bool precise) {
+    if (m_subheader)
+        m_subheader->getGeorefSource().read(fp, m_subheader, info, m_properties.getImageActualWidth(),
+                                            m_properties.getImageActualHeight(), precise);
+}
 
-void CNitfImageSource::writeProjection(FILE*, ProjInfo_t*) {}
+void CNitfImageSource::writeProjection(FILE* fp, ProjInfo_t* info) {
+    if (m_subheader)
+        m_subheader->getGeorefSource().write(fp, info, m_properties.getImageWidth(),
+                                             m_properties.getImageHeight());
+}
 
 bool CNitfImageSource::readBitmap(char*, int, int, int, int, int, int) {
     return false;
