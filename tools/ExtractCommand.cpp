@@ -1,5 +1,5 @@
-// nitf extract: writes an image segment's pixels as raw canonical samples, or as a PNG or PGM/PPM picture for
-// looking at.
+// nitf extract: writes an image segment's pixels as raw canonical samples, as a PNG or PGM/PPM picture for
+// looking at, or as a (Cloud-Optimized) GeoTIFF.
 #include <algorithm>
 #include <chrono>
 #include <cmath>
@@ -22,6 +22,7 @@
 #include "NitfImageSource.h"
 #include "NitfImageSubheader.h"
 #include "NitfLutSource.h"
+#include "NitfGeoTiff.h"
 
 namespace {
 
@@ -33,6 +34,8 @@ struct Options {
     std::string format;
     int image = 0;
     int band = -1;
+    bool cog = false;
+    std::string compression;
 };
 
 class UsageError : public std::runtime_error {
@@ -65,6 +68,10 @@ Options parseOptions(int argc, char** argv) {
             options.format = value();
         else if (arg == "-o")
             options.output = value();
+        else if (arg == "--cog")
+            options.cog = true;
+        else if (arg == "--compress")
+            options.compression = value();
         else if (!arg.empty() && arg[0] == '-')
             throw UsageError("unknown option " + arg);
         else if (options.file.empty())
@@ -74,8 +81,16 @@ Options parseOptions(int argc, char** argv) {
     }
     if (options.file.empty() || options.output.empty() || options.format.empty())
         throw UsageError("FILE, -f and -o are required");
-    if (options.format != "raw" && options.format != "png" && options.format != "pgm")
-        throw UsageError("unknown format '" + options.format + "' (raw, png or pgm)");
+    if (options.format != "raw" && options.format != "png" && options.format != "pgm" &&
+        options.format != "tiff")
+        throw UsageError("unknown format '" + options.format + "' (raw, png, pgm or tiff)");
+    if ((options.cog || !options.compression.empty()) && options.format != "tiff")
+        throw UsageError("--cog and --compress go with -f tiff");
+    if (!options.compression.empty() && options.compression != "deflate" && options.compression != "zstd" &&
+        options.compression != "none")
+        throw UsageError("unknown compression '" + options.compression + "' (deflate, zstd or none)");
+    if (options.format == "tiff" && options.output == "-")
+        throw UsageError("a GeoTIFF is written to a file, not to standard output");
     return options;
 }
 
@@ -466,6 +481,23 @@ PictureFormat pictureFormat(View& view, const BandReader& bands, bool png) {
 
 // ---- the command ------------------------------------------------------------------------------------------
 
+void extractTiff(CNitfFileReader& reader, CNitfImageSource& source, BandReader& bands,
+                 const Options& options) {
+    nitfpicture::TiffOptions tiff;
+    tiff.cog = options.cog;
+    if (options.compression == "deflate")
+        tiff.compression = nitfpicture::Compression::Deflate;
+    else if (options.compression == "zstd")
+        tiff.compression = nitfpicture::Compression::Zstd;
+    else if (options.compression == "none")
+        tiff.compression = nitfpicture::Compression::None;
+    ProgressBar bar;
+    tiff.progress = [&](double fraction) { bar.update(static_cast<long long>(fraction * 1000), 1000); };
+    for (const std::string& note :
+         nitfpicture::writeImageGeoTiff(reader, source, bands, options.band, options.output, tiff))
+        std::fprintf(stderr, "nitf extract: note: %s\n", note.c_str());
+}
+
 void extractRaw(BandReader& bands, const Options& options, OutputFile& out) {
     ProgressBar bar;
     nitfextract::writeCanonical(
@@ -530,6 +562,13 @@ void extractPicture(CNitfFileReader& reader, CNitfImageSource& source, BandReade
     writer->finish();
 }
 
+void reportFailedBlocks(const BandReader& bands) {
+    if (bands.failedBlocks() > 0)
+        std::fprintf(stderr,
+                     "nitf extract: warning: %d block(s) could not be read and are written as zeros\n",
+                     bands.failedBlocks());
+}
+
 } // namespace
 
 int runExtract(int argc, char** argv) {
@@ -539,7 +578,8 @@ int runExtract(int argc, char** argv) {
     } catch (const UsageError& e) {
         std::fprintf(stderr,
                      "nitf extract: %s\n"
-                     "usage: nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm -o OUT\n",
+                     "usage: nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm|tiff [--cog]\n"
+                     "                    [--compress deflate|zstd|none] -o OUT\n",
                      e.what());
         return 2;
     }
@@ -555,16 +595,18 @@ int runExtract(int argc, char** argv) {
         if (options.band >= bands.bands())
             throw std::runtime_error("the image has " + std::to_string(bands.bands()) +
                                      " band(s); there is no band " + std::to_string(options.band));
+        if (options.format == "tiff") {
+            extractTiff(reader, *source, bands, options);
+            reportFailedBlocks(bands);
+            return 0;
+        }
         OutputFile out(options.output);
         if (options.format == "raw")
             extractRaw(bands, options, out);
         else
             extractPicture(reader, *source, bands, options, out);
         out.commit();
-        if (bands.failedBlocks() > 0)
-            std::fprintf(stderr,
-                         "nitf extract: warning: %d block(s) could not be read and are written as zeros\n",
-                         bands.failedBlocks());
+        reportFailedBlocks(bands);
         return 0;
     } catch (const vexo::Exception& e) {
         std::fprintf(stderr, "nitf extract: %s\n", e.what());

@@ -8,14 +8,16 @@
 #include "NitfVersion.h"
 
 static int usage(FILE* out) {
-    std::fprintf(
-        out,
-        "usage: nitf --version\n"
-        "       nitf info [--json] FILE  describe the file's headers, segments and TREs\n"
-        "       nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm -o OUT\n"
-        "                                decode an image (default 0) to canonical raw bytes or a picture\n"
-        "       nitf sample OUT.ntf      write a small demo NITF 2.1 file\n"
-        "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back\n");
+    std::fprintf(out, "usage: nitf --version\n"
+                      "       nitf info [--json] FILE  describe the file's headers, segments and TREs\n"
+                      "       nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm|tiff [--cog]\n"
+                      "                    [--compress deflate|zstd|none] -o OUT\n"
+                      "                                decode an image (default 0) to canonical raw bytes, a "
+                      "picture, or a\n"
+                      "                                GeoTIFF (--cog: Cloud-Optimized, tiled, compressed, "
+                      "with overviews)\n"
+                      "       nitf sample OUT.ntf      write a small demo NITF 2.1 file\n"
+                      "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back\n");
     return out == stdout ? 0 : 2;
 }
 

@@ -1,0 +1,724 @@
+#include "GeoTiffWriter.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <cmath>
+#include <cstdarg>
+#include <cstdint>
+#include <cstdio>
+#include <cstring>
+#include <memory>
+#include <mutex>
+#include <stdexcept>
+
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <geotiff.h>
+#include <geovalues.h>
+#include <tiffio.h>
+#include <xtiffio.h>
+
+namespace nitfpicture {
+
+int sampleBytes(SampleType type) {
+    switch (type) {
+    case SampleType::UInt8:
+    case SampleType::Int8:
+        return 1;
+    case SampleType::UInt16:
+    case SampleType::Int16:
+        return 2;
+    case SampleType::UInt32:
+    case SampleType::Int32:
+    case SampleType::Float32:
+        return 4;
+    case SampleType::UInt64:
+    case SampleType::Int64:
+    case SampleType::Float64:
+    case SampleType::ComplexFloat32:
+        return 8;
+    case SampleType::ComplexFloat64:
+        return 16;
+    }
+    return 0;
+}
+
+namespace {
+
+// ---- libtiff set-up ---------------------------------------------------------------------------------------
+
+// Two private tags that readers of GeoTIFF understand: the RPC model, and the no-data value as text.
+constexpr uint32_t kTagRpcCoefficients = 50844;
+constexpr uint32_t kTagNoData = 42113;
+
+TIFFExtendProc g_parentExtender = nullptr;
+
+void extendTags(TIFF* tif) {
+    static const TIFFFieldInfo fields[] = {
+        {kTagRpcCoefficients, TIFF_VARIABLE2, TIFF_VARIABLE2, TIFF_DOUBLE, FIELD_CUSTOM, 1, 1,
+         const_cast<char*>("RPCCoefficientTag")},
+        {kTagNoData, -1, -1, TIFF_ASCII, FIELD_CUSTOM, 1, 0, const_cast<char*>("GDALNoDataValue")},
+    };
+    TIFFMergeFieldInfo(tif, fields, sizeof fields / sizeof fields[0]);
+    if (g_parentExtender)
+        g_parentExtender(tif);
+}
+
+void registerTags() {
+    static std::once_flag once;
+    std::call_once(once, [] {
+        XTIFFInitialize(); // the GeoTIFF tags
+        g_parentExtender = TIFFSetTagExtender(extendTags);
+    });
+}
+
+// libtiff reports through process-wide handlers: while a file is written, errors are kept for the exception
+// and warnings are dropped.
+thread_local std::string t_lastError;
+
+void keepError(const char* module, const char* format, va_list args) {
+    char text[512];
+    std::vsnprintf(text, sizeof text, format, args);
+    t_lastError = std::string(module ? module : "libtiff") + ": " + text;
+}
+
+void dropWarning(const char*, const char*, va_list) {}
+
+class TiffReporting {
+public:
+    TiffReporting()
+        : m_error(TIFFSetErrorHandler(keepError)), m_warning(TIFFSetWarningHandler(dropWarning)) {}
+    ~TiffReporting() {
+        TIFFSetErrorHandler(m_error);
+        TIFFSetWarningHandler(m_warning);
+    }
+    TiffReporting(const TiffReporting&) = delete;
+    TiffReporting& operator=(const TiffReporting&) = delete;
+
+private:
+    TIFFErrorHandler m_error, m_warning;
+};
+
+[[noreturn]] void fail(const std::string& what) {
+    throw std::runtime_error(what + (t_lastError.empty() ? "" : " (" + t_lastError + ")"));
+}
+
+void check(int result, const char* what) {
+    if (!result)
+        fail(what);
+}
+
+struct TiffCloser {
+    void operator()(TIFF* tif) const { TIFFClose(tif); }
+};
+using TiffFile = std::unique_ptr<TIFF, TiffCloser>;
+
+// ---- what is written --------------------------------------------------------------------------------------
+
+struct Layout {
+    uint16_t format, bits;
+};
+
+Layout layoutOf(SampleType type) {
+    switch (type) {
+    case SampleType::UInt8:
+        return {SAMPLEFORMAT_UINT, 8};
+    case SampleType::Int8:
+        return {SAMPLEFORMAT_INT, 8};
+    case SampleType::UInt16:
+        return {SAMPLEFORMAT_UINT, 16};
+    case SampleType::Int16:
+        return {SAMPLEFORMAT_INT, 16};
+    case SampleType::UInt32:
+        return {SAMPLEFORMAT_UINT, 32};
+    case SampleType::Int32:
+        return {SAMPLEFORMAT_INT, 32};
+    case SampleType::UInt64:
+        return {SAMPLEFORMAT_UINT, 64};
+    case SampleType::Int64:
+        return {SAMPLEFORMAT_INT, 64};
+    case SampleType::Float32:
+        return {SAMPLEFORMAT_IEEEFP, 32};
+    case SampleType::Float64:
+        return {SAMPLEFORMAT_IEEEFP, 64};
+    case SampleType::ComplexFloat32:
+        return {SAMPLEFORMAT_COMPLEXIEEEFP, 64};
+    case SampleType::ComplexFloat64:
+        return {SAMPLEFORMAT_COMPLEXIEEEFP, 128};
+    }
+    return {SAMPLEFORMAT_UINT, 8};
+}
+
+bool isComplex(SampleType type) {
+    return type == SampleType::ComplexFloat32 || type == SampleType::ComplexFloat64;
+}
+
+bool isReal(SampleType type) {
+    return type == SampleType::Float32 || type == SampleType::Float64;
+}
+
+struct LevelSize {
+    int width, height;
+};
+
+// Everything the writer decided once: sizes, tiles, codec.
+struct Plan {
+    RasterFormat format;
+    int tile = 0;
+    uint16_t compression = COMPRESSION_NONE;
+    int codecLevel = -1;
+    uint16_t predictor = PREDICTOR_NONE;
+    bool separate = false; // one plane per band
+    bool paletted = false;
+    int bytes = 0;      // per sample
+    int pixelBytes = 0; // per pixel of a strip row: bands x bytes, or bytes for separate planes
+    std::vector<LevelSize> levels;
+};
+
+Plan makePlan(const RasterFormat& format, const TiffOptions& options) {
+    Plan plan;
+    plan.format = format;
+    if (format.width <= 0 || format.height <= 0 || format.bands <= 0 || format.bands > 65535)
+        throw std::runtime_error("a GeoTIFF needs at least one pixel and one band (and at most 65535 bands)");
+    plan.tile = options.tileSize > 0 ? options.tileSize : (options.cog ? 512 : 256);
+    if (plan.tile % 16 != 0 || plan.tile > 8192)
+        throw std::runtime_error("tile size " + std::to_string(plan.tile) +
+                                 " is not a multiple of 16 up to 8192");
+    Compression compression = options.compression;
+    if (compression == Compression::Default)
+        compression = options.cog ? Compression::Deflate : Compression::None;
+    plan.compression = compression == Compression::Deflate ? COMPRESSION_ADOBE_DEFLATE
+                       : compression == Compression::Zstd  ? COMPRESSION_ZSTD
+                                                           : COMPRESSION_NONE;
+    plan.codecLevel = options.level;
+    if (options.predictor && plan.compression != COMPRESSION_NONE && !isComplex(format.type))
+        plan.predictor = isReal(format.type) ? PREDICTOR_FLOATINGPOINT : PREDICTOR_HORIZONTAL;
+    plan.separate = format.bandSequential && format.bands > 1;
+    plan.bytes = sampleBytes(format.type);
+    plan.pixelBytes = plan.separate ? plan.bytes : plan.bytes * format.bands;
+    const bool paletteType = format.type == SampleType::UInt8 || format.type == SampleType::UInt16;
+    if (!options.palette.empty()) {
+        if (format.bands != 1 || !paletteType || options.palette.size() % 3 != 0)
+            throw std::runtime_error("a colour map needs one band of unsigned 8- or 16-bit samples");
+        plan.paletted = true;
+    }
+    // Overviews halve (rounding up) until the image fits one tile.
+    LevelSize size{format.width, format.height};
+    plan.levels.push_back(size);
+    while (options.cog && (size.width > plan.tile || size.height > plan.tile)) {
+        size = {(size.width + 1) / 2, (size.height + 1) / 2};
+        plan.levels.push_back(size);
+    }
+    return plan;
+}
+
+// Whether a level's data may pass 4 GiB, which needs BigTIFF. Compressed data can grow slightly, the file
+// holds directories too: a generous margin.
+bool needsBigTiff(const Plan& plan, bool allLevels) {
+    double bytes = 0;
+    for (size_t k = 0; k < (allLevels ? plan.levels.size() : 1); ++k) {
+        const LevelSize& size = plan.levels[k];
+        const double tilesAcross = std::ceil(size.width / double(plan.tile));
+        const double tilesDown = std::ceil(size.height / double(plan.tile));
+        bytes += tilesAcross * tilesDown * plan.tile * plan.tile * plan.bytes * plan.format.bands;
+    }
+    return bytes * 1.01 + (64 << 20) > 4294967295.0;
+}
+
+std::string noDataText(double value, SampleType type) {
+    char text[64];
+    if (std::isnan(value))
+        return "nan";
+    if (isReal(type) || isComplex(type))
+        std::snprintf(text, sizeof text, "%.17g", value);
+    else
+        std::snprintf(text, sizeof text, "%.0f", value);
+    return text;
+}
+
+void setImageTags(TIFF* tif, const Plan& plan, const LevelSize& size, const TiffOptions& options,
+                  bool overview) {
+    const RasterFormat& f = plan.format;
+    const Layout layout = layoutOf(f.type);
+    uint16_t photometric = PHOTOMETRIC_MINISBLACK;
+    if (plan.paletted)
+        photometric = PHOTOMETRIC_PALETTE;
+    else if (f.bands == 3 && (f.type == SampleType::UInt8 || f.type == SampleType::UInt16))
+        photometric = PHOTOMETRIC_RGB;
+    bool ok = TIFFSetField(tif, TIFFTAG_IMAGEWIDTH, static_cast<uint32_t>(size.width)) &&
+              TIFFSetField(tif, TIFFTAG_IMAGELENGTH, static_cast<uint32_t>(size.height)) &&
+              TIFFSetField(tif, TIFFTAG_SAMPLESPERPIXEL, static_cast<uint16_t>(f.bands)) &&
+              TIFFSetField(tif, TIFFTAG_BITSPERSAMPLE, layout.bits) &&
+              TIFFSetField(tif, TIFFTAG_SAMPLEFORMAT, layout.format) &&
+              TIFFSetField(tif, TIFFTAG_PLANARCONFIG,
+                           plan.separate ? PLANARCONFIG_SEPARATE : PLANARCONFIG_CONTIG) &&
+              TIFFSetField(tif, TIFFTAG_PHOTOMETRIC, photometric) &&
+              TIFFSetField(tif, TIFFTAG_TILEWIDTH, static_cast<uint32_t>(plan.tile)) &&
+              TIFFSetField(tif, TIFFTAG_TILELENGTH, static_cast<uint32_t>(plan.tile)) &&
+              TIFFSetField(tif, TIFFTAG_COMPRESSION, plan.compression);
+    check(ok, "cannot describe the image");
+    if (photometric == PHOTOMETRIC_MINISBLACK && f.bands > 1) {
+        std::vector<uint16_t> extra(f.bands - 1, EXTRASAMPLE_UNSPECIFIED);
+        check(TIFFSetField(tif, TIFFTAG_EXTRASAMPLES, static_cast<uint16_t>(extra.size()), extra.data()),
+              "cannot describe the bands");
+    }
+    if (plan.predictor != PREDICTOR_NONE)
+        check(TIFFSetField(tif, TIFFTAG_PREDICTOR, plan.predictor), "cannot set the predictor");
+    if (plan.codecLevel >= 0 && plan.compression == COMPRESSION_ADOBE_DEFLATE)
+        check(TIFFSetField(tif, TIFFTAG_ZIPQUALITY, plan.codecLevel), "cannot set the deflate level");
+    if (plan.codecLevel >= 0 && plan.compression == COMPRESSION_ZSTD)
+        check(TIFFSetField(tif, TIFFTAG_ZSTD_LEVEL, plan.codecLevel), "cannot set the zstd level");
+    if (overview)
+        check(TIFFSetField(tif, TIFFTAG_SUBFILETYPE, FILETYPE_REDUCEDIMAGE), "cannot mark the overview");
+    if (plan.paletted) {
+        // Every value the samples can take has an entry; those past the given colours are black.
+        const size_t entries = size_t(1) << layout.bits;
+        std::vector<uint16_t> red(entries), green(entries), blue(entries);
+        const size_t given = std::min(entries, options.palette.size() / 3);
+        for (size_t i = 0; i < given; ++i) {
+            red[i] = static_cast<uint16_t>(options.palette[3 * i] * 257);
+            green[i] = static_cast<uint16_t>(options.palette[3 * i + 1] * 257);
+            blue[i] = static_cast<uint16_t>(options.palette[3 * i + 2] * 257);
+        }
+        check(TIFFSetField(tif, TIFFTAG_COLORMAP, red.data(), green.data(), blue.data()),
+              "cannot write the colour map");
+    }
+    if (options.hasNoData)
+        check(TIFFSetField(tif, kTagNoData, noDataText(options.noData, f.type).c_str()),
+              "cannot write the no-data value");
+}
+
+void setGeoTags(TIFF* tif, const GeoReference& geo) {
+    const bool placed =
+        geo.system != GeoReference::System::None && (geo.hasGeotransform || !geo.tiePoints.empty());
+    if (placed) {
+        if (geo.hasGeotransform) {
+            const double* gt = geo.geotransform;
+            double scale[3] = {gt[1], -gt[5], 0};
+            double tie[6] = {0, 0, 0, gt[0], gt[3], 0};
+            check(TIFFSetField(tif, TIFFTAG_GEOPIXELSCALE, 3, scale) &&
+                      TIFFSetField(tif, TIFFTAG_GEOTIEPOINTS, 6, tie),
+                  "cannot write the geotransform");
+        } else {
+            std::vector<double> ties;
+            for (const GeoReference::TiePoint& p : geo.tiePoints)
+                ties.insert(ties.end(), {p.col, p.row, 0, p.x, p.y, 0});
+            check(TIFFSetField(tif, TIFFTAG_GEOTIEPOINTS, static_cast<uint32_t>(ties.size()), ties.data()),
+                  "cannot write the tie points");
+        }
+        GTIF* keys = GTIFNew(tif);
+        if (!keys)
+            fail("cannot start the GeoTIFF keys");
+        GTIFKeySet(keys, GTRasterTypeGeoKey, TYPE_SHORT, 1, RasterPixelIsArea);
+        if (geo.system == GeoReference::System::Geographic) {
+            GTIFKeySet(keys, GTModelTypeGeoKey, TYPE_SHORT, 1, ModelTypeGeographic);
+            GTIFKeySet(keys, GeographicTypeGeoKey, TYPE_SHORT, 1, GCS_WGS_84);
+            GTIFKeySet(keys, GeogAngularUnitsGeoKey, TYPE_SHORT, 1, Angular_Degree);
+        } else {
+            // The EPSG codes of WGS 84 / UTM: 326zz north, 327zz south.
+            GTIFKeySet(keys, GTModelTypeGeoKey, TYPE_SHORT, 1, ModelTypeProjected);
+            GTIFKeySet(keys, ProjectedCSTypeGeoKey, TYPE_SHORT, 1, (geo.southern ? 32700 : 32600) + geo.zone);
+            GTIFKeySet(keys, ProjLinearUnitsGeoKey, TYPE_SHORT, 1, Linear_Meter);
+        }
+        const int written = GTIFWriteKeys(keys);
+        GTIFFree(keys);
+        check(written, "cannot write the GeoTIFF keys");
+    }
+    if (geo.rpc.size() == 92)
+        check(TIFFSetField(tif, kTagRpcCoefficients, 92, geo.rpc.data()), "cannot write the RPC model");
+    else if (!geo.rpc.empty())
+        throw std::runtime_error("an RPC model has 92 values, not " + std::to_string(geo.rpc.size()));
+}
+
+// ---- halving a strip --------------------------------------------------------------------------------------
+
+template <typename T> struct Sum { using type = int64_t; };
+template <> struct Sum<uint64_t> { using type = __int128; };
+template <> struct Sum<int64_t> { using type = __int128; };
+template <> struct Sum<float> { using type = double; };
+template <> struct Sum<double> { using type = double; };
+
+// The mean of `n` values summing to `sum`, rounded half up for integers.
+template <typename T> T mean(typename Sum<T>::type sum, int n) {
+    if constexpr (std::is_floating_point<T>::value) {
+        return static_cast<T>(sum / n);
+    } else {
+        using S = typename Sum<T>::type;
+        const S numerator = 2 * sum + n, denominator = 2 * static_cast<S>(n);
+        S quotient = numerator / denominator;
+        if ((numerator % denominator != 0) && (numerator < 0))
+            --quotient; // floor, not truncation
+        return static_cast<T>(quotient);
+    }
+}
+
+struct Halving {
+    bool nearest = false; // colour-mapped samples are indexes: they are picked, not averaged
+    bool hasNoData = false;
+    double noData = 0;
+};
+
+template <typename T> bool isNoData(T value, const Halving& how) {
+    if constexpr (std::is_floating_point<T>::value) {
+        if (std::isnan(how.noData))
+            return std::isnan(value);
+    }
+    return static_cast<double>(value) == how.noData;
+}
+
+// Halves `rows` rows of `width` pixels of `elements` values each (rows `inStride` values apart) into
+// ceil(rows / 2) rows of ceil(width / 2) pixels (`outStride` apart). At an odd edge the last row or column
+// stands in for its missing neighbour, which leaves the mean of what is there unchanged.
+template <typename T>
+void halve(const T* in, size_t inStride, int width, int rows, int elements, T* out, size_t outStride,
+           const Halving& how) {
+    using S = typename Sum<T>::type;
+    const int outWidth = (width + 1) / 2, outRows = (rows + 1) / 2;
+    for (int r = 0; r < outRows; ++r) {
+        const T* a = in + 2 * r * inStride;
+        const T* b = 2 * r + 1 < rows ? a + inStride : a;
+        T* o = out + r * outStride;
+        for (int c = 0; c < outWidth; ++c) {
+            const size_t left = static_cast<size_t>(2 * c) * elements;
+            const size_t right = static_cast<size_t>(std::min(2 * c + 1, width - 1)) * elements;
+            for (int e = 0; e < elements; ++e) {
+                const T v[4] = {a[left + e], a[right + e], b[left + e], b[right + e]};
+                T& result = o[static_cast<size_t>(c) * elements + e];
+                if (how.nearest) {
+                    result = v[0];
+                } else if (!how.hasNoData) {
+                    result = mean<T>(S(v[0]) + S(v[1]) + S(v[2]) + S(v[3]), 4);
+                } else {
+                    S sum = 0;
+                    int n = 0;
+                    for (T value : v) {
+                        if (!isNoData(value, how)) {
+                            sum += S(value);
+                            ++n;
+                        }
+                    }
+                    result = n ? mean<T>(sum, n) : static_cast<T>(how.noData);
+                }
+            }
+        }
+    }
+}
+
+// The same on raw bytes of a sample type: complex samples are two values each.
+void halveBytes(SampleType type, const unsigned char* in, size_t inRowBytes, int width, int rows, int samples,
+                unsigned char* out, size_t outRowBytes, const Halving& how) {
+    auto run = [&](auto element, int elements) {
+        using T = decltype(element);
+        halve(reinterpret_cast<const T*>(in), inRowBytes / sizeof(T), width, rows, elements,
+              reinterpret_cast<T*>(out), outRowBytes / sizeof(T), how);
+    };
+    switch (type) {
+    case SampleType::UInt8:
+        return run(uint8_t(), samples);
+    case SampleType::Int8:
+        return run(int8_t(), samples);
+    case SampleType::UInt16:
+        return run(uint16_t(), samples);
+    case SampleType::Int16:
+        return run(int16_t(), samples);
+    case SampleType::UInt32:
+        return run(uint32_t(), samples);
+    case SampleType::Int32:
+        return run(int32_t(), samples);
+    case SampleType::UInt64:
+        return run(uint64_t(), samples);
+    case SampleType::Int64:
+        return run(int64_t(), samples);
+    case SampleType::Float32:
+        return run(float(), samples);
+    case SampleType::Float64:
+        return run(double(), samples);
+    case SampleType::ComplexFloat32:
+        return run(float(), 2 * samples);
+    case SampleType::ComplexFloat64:
+        return run(double(), 2 * samples);
+    }
+}
+
+// ---- levels -----------------------------------------------------------------------------------------------
+
+// One resolution level: a strip of one tile row, filled from the source or from the level above, and encoded
+// tile by tile into `tiff`. Band-sequential strips hold one plane of `tile` rows per band.
+class Level {
+public:
+    Level(const Plan& plan, const LevelSize& size, TIFF* tiff, bool fromSource)
+        : m_plan(plan), m_size(size), m_tiff(tiff), m_fromSource(fromSource),
+          m_rowBytes(static_cast<size_t>(size.width) * plan.pixelBytes), m_planeBytes(m_rowBytes * plan.tile),
+          m_strip(m_planeBytes * (plan.separate ? plan.format.bands : 1)),
+          m_tileBuffer(static_cast<size_t>(plan.tile) * plan.tile * plan.pixelBytes) {}
+
+    const LevelSize& size() const { return m_size; }
+    bool fromSource() const { return m_fromSource; }
+    bool complete() const { return m_nextRow >= m_size.height; }
+    int stripCapacity() const { return std::min(m_plan.tile, m_size.height - m_nextRow); }
+    int nextRow() const { return m_nextRow; }
+    int filled() const { return m_filled; }
+    size_t rowBytes() const { return m_rowBytes; }
+    int planes() const { return m_plan.separate ? m_plan.format.bands : 1; }
+    unsigned char* row(int plane, int row) {
+        return m_strip.data() + plane * m_planeBytes + row * m_rowBytes;
+    }
+
+    // Reads the next strip from the source: decoded straight into the strip, planes then spread to their
+    // places when the strip is short.
+    void readFrom(RowSource& source, int level) {
+        const int count = stripCapacity();
+        source.readRows(level, m_nextRow, count, m_strip.data());
+        if (m_plan.separate && count < m_plan.tile) {
+            for (int plane = planes() - 1; plane > 0; --plane)
+                std::memmove(row(plane, 0), m_strip.data() + plane * count * m_rowBytes, count * m_rowBytes);
+        }
+        m_filled = count;
+    }
+
+    // Takes `rows` rows halved from a strip of the level above.
+    void addHalved(Level& above, const Halving& how) {
+        const int rows = (above.filled() + 1) / 2;
+        for (int plane = 0; plane < planes(); ++plane)
+            halveBytes(m_plan.format.type, above.row(plane, 0), above.rowBytes(), above.size().width,
+                       above.filled(), m_plan.separate ? 1 : m_plan.format.bands, row(plane, m_filled),
+                       m_rowBytes, how);
+        m_filled += rows;
+    }
+
+    bool stripFull() const { return m_filled > 0 && m_filled == stripCapacity(); }
+
+    // Encodes the strip's tiles (padded with zeros at the right and bottom edges) and starts the next strip.
+    void encodeStrip() {
+        const int tile = m_plan.tile, tileRow = m_nextRow / tile;
+        const size_t tileRowBytes = static_cast<size_t>(tile) * m_plan.pixelBytes;
+        for (int plane = 0; plane < planes(); ++plane) {
+            for (int x = 0; x * tile < m_size.width; ++x) {
+                const int cols = std::min(tile, m_size.width - x * tile);
+                const size_t copied = static_cast<size_t>(cols) * m_plan.pixelBytes;
+                if (cols < tile || m_filled < tile)
+                    std::fill(m_tileBuffer.begin(), m_tileBuffer.end(), 0);
+                for (int r = 0; r < m_filled; ++r)
+                    std::memcpy(m_tileBuffer.data() + r * tileRowBytes, row(plane, r) + x * tileRowBytes,
+                                copied);
+                const uint32_t index =
+                    TIFFComputeTile(m_tiff, static_cast<uint32_t>(x * tile),
+                                    static_cast<uint32_t>(tileRow * tile), 0, static_cast<uint16_t>(plane));
+                if (TIFFWriteEncodedTile(m_tiff, index, m_tileBuffer.data(),
+                                         static_cast<tmsize_t>(m_tileBuffer.size())) < 0)
+                    fail("cannot write a tile");
+            }
+        }
+        m_nextRow += m_filled;
+        m_filled = 0;
+    }
+
+private:
+    const Plan& m_plan;
+    LevelSize m_size;
+    TIFF* m_tiff;
+    bool m_fromSource;
+    size_t m_rowBytes, m_planeBytes;
+    std::vector<unsigned char> m_strip;
+    std::vector<unsigned char> m_tileBuffer;
+    int m_nextRow = 0;
+    int m_filled = 0;
+};
+
+// Reads every level that comes from the source, strip by strip, and feeds the levels averaged from it.
+class Pyramid {
+public:
+    Pyramid(RowSource& source, const Plan& plan, const TiffOptions& options, std::vector<Level>& levels,
+            double progressShare)
+        : m_source(source), m_options(options), m_levels(levels), m_share(progressShare) {
+        m_how.nearest = plan.paletted;
+        m_how.hasNoData = options.hasNoData;
+        m_how.noData = options.noData;
+        for (const Level& level : levels)
+            if (level.fromSource())
+                m_total += static_cast<double>(level.size().width) * level.size().height;
+    }
+
+    void run() {
+        for (size_t k = 0; k < m_levels.size(); ++k) {
+            if (!m_levels[k].fromSource())
+                continue;
+            Level& level = m_levels[k];
+            while (!level.complete()) {
+                const int rows = level.stripCapacity();
+                level.readFrom(m_source, static_cast<int>(k));
+                finishStrip(k);
+                m_done += static_cast<double>(level.size().width) * rows;
+                if (m_options.progress)
+                    m_options.progress(m_share * m_done / m_total);
+            }
+        }
+    }
+
+private:
+    // Encodes level k's full strip and hands it down to the level below when that one is averaged.
+    void finishStrip(size_t k) {
+        Level& level = m_levels[k];
+        if (k + 1 < m_levels.size() && !m_levels[k + 1].fromSource()) {
+            Level& below = m_levels[k + 1];
+            below.addHalved(level, m_how);
+            level.encodeStrip();
+            if (below.stripFull())
+                finishStrip(k + 1);
+        } else {
+            level.encodeStrip();
+        }
+    }
+
+    RowSource& m_source;
+    const TiffOptions& m_options;
+    std::vector<Level>& m_levels;
+    double m_share;
+    Halving m_how;
+    double m_total = 0, m_done = 0;
+};
+
+// ---- files ------------------------------------------------------------------------------------------------
+
+// Removes the output unless the writing completes.
+class OutputGuard {
+public:
+    explicit OutputGuard(const std::string& path) : m_path(path) {}
+    ~OutputGuard() {
+        if (!m_kept)
+            std::remove(m_path.c_str());
+    }
+    OutputGuard(const OutputGuard&) = delete;
+    OutputGuard& operator=(const OutputGuard&) = delete;
+    void keep() { m_kept = true; }
+
+private:
+    std::string m_path;
+    bool m_kept = false;
+};
+
+TiffFile openTiff(const std::string& path, const char* mode) {
+    TiffFile tif(XTIFFOpen(path.c_str(), mode));
+    if (!tif)
+        fail("cannot open " + path);
+    return tif;
+}
+
+// A scratch TIFF next to the output (so on the same disk), deleted from the directory at once: it
+// disappears with its handle whatever happens.
+TiffFile scratchTiff(const std::string& outputPath, bool big) {
+    const size_t slash = outputPath.find_last_of('/');
+    std::string pattern =
+        (slash == std::string::npos ? std::string(".") : outputPath.substr(0, slash)) + "/.nitf-level-XXXXXX";
+    const int fd = mkstemp(&pattern[0]);
+    if (fd < 0)
+        throw std::runtime_error("cannot create a scratch file beside " + outputPath + ": " +
+                                 std::strerror(errno));
+    unlink(pattern.c_str());
+    TiffFile tif(TIFFFdOpen(fd, pattern.c_str(), big ? "w8" : "w"));
+    if (!tif) {
+        close(fd);
+        fail("cannot start a scratch file");
+    }
+    return tif;
+}
+
+// The compressed tiles of `from`, in index order, appended to the current directory of `to`.
+void copyTiles(TIFF* from, TIFF* to) {
+    std::vector<unsigned char> buffer;
+    const uint32_t tiles = TIFFNumberOfTiles(from);
+    const int fd = TIFFFileno(from);
+    for (uint32_t t = 0; t < tiles; ++t) {
+        const uint64_t size = TIFFGetStrileByteCount(from, t);
+        const uint64_t offset = TIFFGetStrileOffset(from, t);
+        buffer.resize(size);
+        size_t got = 0;
+        while (got < size) {
+            const ssize_t n = pread(fd, buffer.data() + got, size - got, static_cast<off_t>(offset + got));
+            if (n <= 0)
+                throw std::runtime_error("cannot read back a scratch tile");
+            got += static_cast<size_t>(n);
+        }
+        if (TIFFWriteRawTile(to, t, buffer.data(), static_cast<tmsize_t>(size)) < 0)
+            fail("cannot write a tile");
+    }
+}
+
+void writePlain(const std::string& path, RowSource& source, const GeoReference& geo,
+                const TiffOptions& options, const Plan& plan) {
+    TiffFile tif = openTiff(path, needsBigTiff(plan, false) ? "w8" : "w");
+    setImageTags(tif.get(), plan, plan.levels[0], options, false);
+    setGeoTags(tif.get(), geo);
+    std::vector<Level> levels;
+    levels.emplace_back(plan, plan.levels[0], tif.get(), true);
+    Pyramid(source, plan, options, levels, 1.0).run();
+    check(TIFFWriteDirectory(tif.get()), "cannot write the image directory");
+    tif.reset();
+}
+
+// Every level is encoded into a scratch file first; then the output gets every directory at its start, with
+// the tile tables right after them, and the tiles copied as they are, smallest level first, the tables being
+// rewritten in place.
+void writeCloudOptimized(const std::string& path, RowSource& source, const GeoReference& geo,
+                         const TiffOptions& options, const Plan& plan) {
+    const bool big = needsBigTiff(plan, true);
+    const int reduced = std::max(0, source.reducedLevels());
+    std::vector<TiffFile> scratch;
+    std::vector<Level> levels;
+    levels.reserve(plan.levels.size());
+    for (size_t k = 0; k < plan.levels.size(); ++k) {
+        scratch.push_back(scratchTiff(path, big));
+        setImageTags(scratch.back().get(), plan, plan.levels[k], options, k > 0);
+        levels.emplace_back(plan, plan.levels[k], scratch.back().get(),
+                            k == 0 || static_cast<int>(k) <= reduced);
+    }
+    const double encodingShare = 0.9;
+    Pyramid(source, plan, options, levels, encodingShare).run();
+
+    {
+        // Every directory first, each followed by its tile tables (all zero until the tiles are there).
+        TiffFile out = openTiff(path, big ? "w8" : "w");
+        for (size_t k = 0; k < plan.levels.size(); ++k) {
+            setImageTags(out.get(), plan, plan.levels[k], options, k > 0);
+            if (k == 0)
+                setGeoTags(out.get(), geo);
+            check(TIFFWriteCheck(out.get(), 1, "directory"), "cannot prepare an image directory");
+            check(TIFFWriteDirectory(out.get()), "cannot write an image directory");
+        }
+    }
+    TiffFile out = openTiff(path, "r+");
+    long long copied = 0, total = 0;
+    for (const TiffFile& level : scratch)
+        total += TIFFNumberOfTiles(level.get());
+    for (size_t k = plan.levels.size(); k-- > 0;) {
+        check(TIFFSetDirectory(out.get(), static_cast<tdir_t>(k)), "cannot reopen an image directory");
+        copyTiles(scratch[k].get(), out.get());
+        // The tables were written in place: same count and type, now with the offsets.
+        check(TIFFForceStrileArrayWriting(out.get()), "cannot complete the tile tables");
+        copied += TIFFNumberOfTiles(scratch[k].get());
+        if (options.progress)
+            options.progress(encodingShare + (1 - encodingShare) * copied / total);
+    }
+    out.reset();
+}
+
+} // namespace
+
+void writeGeoTiff(const std::string& path, RowSource& source, const GeoReference& geo,
+                  const TiffOptions& options) {
+    registerTags();
+    TiffReporting reporting;
+    t_lastError.clear();
+    const Plan plan = makePlan(source.format(), options);
+    OutputGuard guard(path);
+    if (options.cog)
+        writeCloudOptimized(path, source, geo, options, plan);
+    else
+        writePlain(path, source, geo, options, plan);
+    guard.keep();
+    if (options.progress)
+        options.progress(1.0);
+}
+
+} // namespace nitfpicture
