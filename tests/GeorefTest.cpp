@@ -21,6 +21,7 @@
 #include "NitfTestFile.h"
 #include "RpcSource.h"
 #include "TestFiles.h"
+#include "TreBytes.h"
 
 using nitf_georef::CornerPoint;
 using Form = CNitfGeorefInfo::eCoordinateType_t;
@@ -517,55 +518,8 @@ TEST(GeorefInfo, WritingRefusesWhatItCannotWrite) {
     EXPECT_EQ(CNitfGeorefInfo::chooseIcords(nullptr, eNitfVersion20), 'N');
 }
 
-namespace {
-
-std::string number(const char* format, double value) {
-    char text[32];
-    std::snprintf(text, sizeof text, format, value);
-    return text;
-}
-
-// line = 500 - 500 P, sample = 500 + 500 L with P = (lat - 45) / 0.1, L = (lon - 10) / 0.1.
-std::string rpcData() {
-    std::string data = "1";
-    data += "0001.00"
-            "0000.50"
-            "000500"
-            "00500"
-            "+45.0000"
-            "+010.0000"
-            "+0000"
-            "000500"
-            "00500"
-            "+00.1000"
-            "+000.1000"
-            "+0500";
-    auto polynomial = [](int term, const char* value) {
-        std::string out;
-        for (int i = 1; i <= 20; ++i)
-            out += i == term ? value : "+0.000000E+0";
-        return out;
-    };
-    data += polynomial(3, "-1.000000E+0") + polynomial(1, "+1.000000E+0") + polynomial(2, "+1.000000E+0") +
-            polynomial(1, "+1.000000E+0");
-    return data;
-}
-
-// A chip at twice the full image's pixel size, starting at full row 100, column 200.
-std::string ichipbData() {
-    std::string data = "00" + std::string("0002.00000") + "00" + "00";
-    const double chip[4][2] = {{0.5, 0.5}, {0.5, 99.5}, {99.5, 0.5}, {99.5, 99.5}};
-    for (const auto& point : chip)
-        data += number("%012.3f", point[0]) + number("%012.3f", point[1]);
-    for (const auto& point : chip)
-        data += number("%012.3f", 100 + 2 * point[0]) + number("%012.3f", 200 + 2 * point[1]);
-    return data + "00001000" + "00001000";
-}
-
-} // namespace
-
 TEST(GeorefInfo, SensorModelWithItsChip) {
-    OpenedSample plain(georeferencedFile(0, "", 100, 100, {{"RPC00B", rpcData()}}));
+    OpenedSample plain(georeferencedFile(0, "", 100, 100, {{"RPC00B", sampleRpc00b()}}));
     std::unique_ptr<CNitfImageSource> image(plain.reader().getNewImageSource(0));
     CNitfImageSubheader* subheader = image->getImageSubheader();
     std::unique_ptr<CRpcSource> model(
@@ -578,7 +532,7 @@ TEST(GeorefInfo, SensorModelWithItsChip) {
     EXPECT_NEAR(sample, 1000, 1e-9);
 
     OpenedSample chipped(
-        georeferencedFile(0, "", 100, 100, {{"ICHIPB", ichipbData()}, {"RPC00B", rpcData()}}));
+        georeferencedFile(0, "", 100, 100, {{"ICHIPB", sampleIchipb()}, {"RPC00B", sampleRpc00b()}}));
     image.reset(chipped.reader().getNewImageSource(0));
     subheader = image->getImageSubheader();
     model.reset(subheader->getGeorefSource().getNewSensorModel(chipped.reader().getInputStream(), subheader));
@@ -589,7 +543,7 @@ TEST(GeorefInfo, SensorModelWithItsChip) {
     EXPECT_NEAR(sample, 400, 1e-9);
 
     CapturedWarnings warnings;
-    OpenedSample cut(georeferencedFile(0, "", 100, 100, {{"RPC00B", rpcData().substr(0, 500)}}));
+    OpenedSample cut(georeferencedFile(0, "", 100, 100, {{"RPC00B", sampleRpc00b().substr(0, 500)}}));
     image.reset(cut.reader().getNewImageSource(0));
     subheader = image->getImageSubheader();
     EXPECT_EQ(subheader->getGeorefSource().getNewSensorModel(cut.reader().getInputStream(), subheader),
