@@ -4,6 +4,6 @@
 
 #include <string>
 
-// Returns normally when the file was read or refused with vexo::Exception (the message goes to `refusal`,
-// when given); anything else (a crash, another exception type) is the caller's failure to report.
+// Returns normally when the file was read or refused with vexo::Exception (the message goes to `refusal`, when
+// given); anything else (a crash, another exception type) is the caller's failure to report.
 void walkFile(const std::string& path, std::string* refusal = nullptr);
