@@ -169,10 +169,9 @@ struct Plan {
     uint16_t compression = COMPRESSION_NONE;
     int codecLevel = -1;
     uint16_t predictor = PREDICTOR_NONE;
-    bool separate = false; // one plane per band
     bool paletted = false;
     int bytes = 0;      // per sample
-    int pixelBytes = 0; // per pixel of a strip row: bands x bytes, or bytes for separate planes
+    int pixelBytes = 0; // bands x bytes
     std::vector<LevelSize> levels;
 };
 
@@ -194,9 +193,8 @@ Plan makePlan(const RasterFormat& format, const TiffOptions& options) {
     plan.codecLevel = options.level;
     if (options.predictor && plan.compression != COMPRESSION_NONE && !isComplex(format.type))
         plan.predictor = isReal(format.type) ? PREDICTOR_FLOATINGPOINT : PREDICTOR_HORIZONTAL;
-    plan.separate = format.bandSequential && format.bands > 1;
     plan.bytes = sampleBytes(format.type);
-    plan.pixelBytes = plan.separate ? plan.bytes : plan.bytes * format.bands;
+    plan.pixelBytes = plan.bytes * format.bands;
     const bool paletteType = format.type == SampleType::UInt8 || format.type == SampleType::UInt16;
     if (!options.palette.empty()) {
         if (format.bands != 1 || !paletteType || options.palette.size() % 3 != 0)
@@ -251,8 +249,7 @@ void setImageTags(TIFF* tif, const Plan& plan, const LevelSize& size, const Tiff
               TIFFSetField(tif, TIFFTAG_SAMPLESPERPIXEL, static_cast<uint16_t>(f.bands)) &&
               TIFFSetField(tif, TIFFTAG_BITSPERSAMPLE, layout.bits) &&
               TIFFSetField(tif, TIFFTAG_SAMPLEFORMAT, layout.format) &&
-              TIFFSetField(tif, TIFFTAG_PLANARCONFIG,
-                           plan.separate ? PLANARCONFIG_SEPARATE : PLANARCONFIG_CONTIG) &&
+              TIFFSetField(tif, TIFFTAG_PLANARCONFIG, PLANARCONFIG_CONTIG) &&
               TIFFSetField(tif, TIFFTAG_PHOTOMETRIC, photometric) &&
               TIFFSetField(tif, TIFFTAG_TILEWIDTH, static_cast<uint32_t>(plan.tile)) &&
               TIFFSetField(tif, TIFFTAG_TILELENGTH, static_cast<uint32_t>(plan.tile)) &&
@@ -443,48 +440,67 @@ void halveBytes(SampleType type, const unsigned char* in, size_t inRowBytes, int
 
 // ---- levels -----------------------------------------------------------------------------------------------
 
-// One resolution level: a strip of one tile row, filled from the source or from the level above, and encoded
-// tile by tile into `tiff`. Band-sequential strips hold one plane of `tile` rows per band.
+// Band-sequential rows (`bands` planes of `rows` x `width` samples of `bytes`) into pixel-interleaved ones.
+template <size_t Bytes>
+void interleaveSized(const unsigned char* planes, int bands, int rows, int width, unsigned char* out) {
+    const size_t plane = static_cast<size_t>(rows) * width;
+    for (size_t i = 0; i < plane; ++i)
+        for (int b = 0; b < bands; ++b)
+            std::memcpy(out + (i * bands + b) * Bytes, planes + (b * plane + i) * Bytes, Bytes);
+}
+
+void interleave(const unsigned char* planes, int bands, int rows, int width, int bytes, unsigned char* out) {
+    switch (bytes) {
+    case 1:
+        return interleaveSized<1>(planes, bands, rows, width, out);
+    case 2:
+        return interleaveSized<2>(planes, bands, rows, width, out);
+    case 4:
+        return interleaveSized<4>(planes, bands, rows, width, out);
+    case 8:
+        return interleaveSized<8>(planes, bands, rows, width, out);
+    default:
+        return interleaveSized<16>(planes, bands, rows, width, out);
+    }
+}
+
+// One resolution level: a strip of one tile row of pixel-interleaved samples, filled from the source or from
+// the level above, and encoded tile by tile into `tiff`.
 class Level {
 public:
     Level(const Plan& plan, const LevelSize& size, TIFF* tiff, bool fromSource)
         : m_plan(plan), m_size(size), m_tiff(tiff), m_fromSource(fromSource),
-          m_rowBytes(static_cast<size_t>(size.width) * plan.pixelBytes), m_planeBytes(m_rowBytes * plan.tile),
-          m_strip(m_planeBytes * (plan.separate ? plan.format.bands : 1)),
+          m_rowBytes(static_cast<size_t>(size.width) * plan.pixelBytes), m_strip(m_rowBytes * plan.tile),
           m_tileBuffer(static_cast<size_t>(plan.tile) * plan.tile * plan.pixelBytes) {}
 
     const LevelSize& size() const { return m_size; }
     bool fromSource() const { return m_fromSource; }
     bool complete() const { return m_nextRow >= m_size.height; }
     int stripCapacity() const { return std::min(m_plan.tile, m_size.height - m_nextRow); }
-    int nextRow() const { return m_nextRow; }
     int filled() const { return m_filled; }
     size_t rowBytes() const { return m_rowBytes; }
-    int planes() const { return m_plan.separate ? m_plan.format.bands : 1; }
-    unsigned char* row(int plane, int row) {
-        return m_strip.data() + plane * m_planeBytes + row * m_rowBytes;
-    }
+    unsigned char* row(int row) { return m_strip.data() + row * m_rowBytes; }
 
-    // Reads the next strip from the source: decoded straight into the strip, planes then spread to their
-    // places when the strip is short.
-    void readFrom(RowSource& source, int level) {
+    // Reads the next strip from the source: decoded straight into the strip when the source interleaves
+    // pixels, else into `planes` and interleaved from there.
+    void readFrom(RowSource& source, int level, std::vector<unsigned char>& planes) {
         const int count = stripCapacity();
-        source.readRows(level, m_nextRow, count, m_strip.data());
-        if (m_plan.separate && count < m_plan.tile) {
-            for (int plane = planes() - 1; plane > 0; --plane)
-                std::memmove(row(plane, 0), m_strip.data() + plane * count * m_rowBytes, count * m_rowBytes);
+        const RasterFormat& f = m_plan.format;
+        if (f.bandSequential && f.bands > 1) {
+            planes.resize(m_rowBytes * count);
+            source.readRows(level, m_nextRow, count, planes.data());
+            interleave(planes.data(), f.bands, count, m_size.width, m_plan.bytes, m_strip.data());
+        } else {
+            source.readRows(level, m_nextRow, count, m_strip.data());
         }
         m_filled = count;
     }
 
-    // Takes `rows` rows halved from a strip of the level above.
+    // Takes the rows halved from the strip of the level above.
     void addHalved(Level& above, const Halving& how) {
-        const int rows = (above.filled() + 1) / 2;
-        for (int plane = 0; plane < planes(); ++plane)
-            halveBytes(m_plan.format.type, above.row(plane, 0), above.rowBytes(), above.size().width,
-                       above.filled(), m_plan.separate ? 1 : m_plan.format.bands, row(plane, m_filled),
-                       m_rowBytes, how);
-        m_filled += rows;
+        halveBytes(m_plan.format.type, above.row(0), above.rowBytes(), above.size().width, above.filled(),
+                   m_plan.format.bands, row(m_filled), m_rowBytes, how);
+        m_filled += (above.filled() + 1) / 2;
     }
 
     bool stripFull() const { return m_filled > 0 && m_filled == stripCapacity(); }
@@ -493,22 +509,18 @@ public:
     void encodeStrip() {
         const int tile = m_plan.tile, tileRow = m_nextRow / tile;
         const size_t tileRowBytes = static_cast<size_t>(tile) * m_plan.pixelBytes;
-        for (int plane = 0; plane < planes(); ++plane) {
-            for (int x = 0; x * tile < m_size.width; ++x) {
-                const int cols = std::min(tile, m_size.width - x * tile);
-                const size_t copied = static_cast<size_t>(cols) * m_plan.pixelBytes;
-                if (cols < tile || m_filled < tile)
-                    std::fill(m_tileBuffer.begin(), m_tileBuffer.end(), 0);
-                for (int r = 0; r < m_filled; ++r)
-                    std::memcpy(m_tileBuffer.data() + r * tileRowBytes, row(plane, r) + x * tileRowBytes,
-                                copied);
-                const uint32_t index =
-                    TIFFComputeTile(m_tiff, static_cast<uint32_t>(x * tile),
-                                    static_cast<uint32_t>(tileRow * tile), 0, static_cast<uint16_t>(plane));
-                if (TIFFWriteEncodedTile(m_tiff, index, m_tileBuffer.data(),
-                                         static_cast<tmsize_t>(m_tileBuffer.size())) < 0)
-                    fail("cannot write a tile");
-            }
+        for (int x = 0; x * tile < m_size.width; ++x) {
+            const int cols = std::min(tile, m_size.width - x * tile);
+            const size_t copied = static_cast<size_t>(cols) * m_plan.pixelBytes;
+            if (cols < tile || m_filled < tile)
+                std::fill(m_tileBuffer.begin(), m_tileBuffer.end(), 0);
+            for (int r = 0; r < m_filled; ++r)
+                std::memcpy(m_tileBuffer.data() + r * tileRowBytes, row(r) + x * tileRowBytes, copied);
+            const uint32_t index = TIFFComputeTile(m_tiff, static_cast<uint32_t>(x * tile),
+                                                   static_cast<uint32_t>(tileRow * tile), 0, 0);
+            if (TIFFWriteEncodedTile(m_tiff, index, m_tileBuffer.data(),
+                                     static_cast<tmsize_t>(m_tileBuffer.size())) < 0)
+                fail("cannot write a tile");
         }
         m_nextRow += m_filled;
         m_filled = 0;
@@ -519,7 +531,7 @@ private:
     LevelSize m_size;
     TIFF* m_tiff;
     bool m_fromSource;
-    size_t m_rowBytes, m_planeBytes;
+    size_t m_rowBytes;
     std::vector<unsigned char> m_strip;
     std::vector<unsigned char> m_tileBuffer;
     int m_nextRow = 0;
@@ -547,7 +559,7 @@ public:
             Level& level = m_levels[k];
             while (!level.complete()) {
                 const int rows = level.stripCapacity();
-                level.readFrom(m_source, static_cast<int>(k));
+                level.readFrom(m_source, static_cast<int>(k), m_planes);
                 finishStrip(k);
                 m_done += static_cast<double>(level.size().width) * rows;
                 if (m_options.progress)
@@ -576,6 +588,7 @@ private:
     std::vector<Level>& m_levels;
     double m_share;
     Halving m_how;
+    std::vector<unsigned char> m_planes; // band-sequential rows on their way to the strip
     double m_total = 0, m_done = 0;
 };
 

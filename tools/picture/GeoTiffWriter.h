@@ -31,7 +31,8 @@ struct RasterFormat {
     int width = 0, height = 0, bands = 0;
     SampleType type = SampleType::UInt8;
     // How readRows lays out `count` rows: pixel-interleaved, each row holding every band of a pixel in turn
-    // (false), or band-sequential, `count` rows of the first band, then of the second, ... (true).
+    // (false), or band-sequential, `count` rows of the first band, then of the second, ... (true). The file
+    // interleaves pixels either way: correlated bands compress far better so, and readers expect it.
     bool bandSequential = false;
 };
 
