@@ -134,35 +134,8 @@ TEST(GeorefReport, TextAndJsonOfEachKindOfImage) {
     EXPECT_EQ(nitfgeoref::reportJson(none), nlohmann::json({{"icords", " "}, {"coordinate_type", "none"}}));
 }
 
-TEST(NitfGeoTiff, PlacementAndRpcTag) {
-    nitfsample::File file;
-    file.images.push_back(imageWith('G', kRectangleG, 101, 201));
-    file.images.push_back(
-        imageWith('D', "+10.000+020.000+10.000+021.000+09.000+021.500+09.000+020.000", 10, 20));
-    file.images.push_back(
-        imageWith('S', "327933278155361327943278155361327943278145361327933278145361", 11, 11));
-    OpenedSample sample(file);
+TEST(NitfGeoTiff, RpcTagInTheImagesPixels) {
     std::vector<std::string> notes;
-    GeoReference g = geoReferenceOf(summaryOf(sample, 0), notes);
-    EXPECT_EQ(g.system, GeoReference::System::Geographic);
-    EXPECT_TRUE(g.hasGeotransform);
-    EXPECT_NEAR(g.geotransform[0], -20.1, 1e-12);
-    EXPECT_TRUE(g.tiePoints.empty());
-    GeoReference skew = geoReferenceOf(summaryOf(sample, 1), notes);
-    EXPECT_FALSE(skew.hasGeotransform);
-    ASSERT_EQ(skew.tiePoints.size(), 4u);
-    EXPECT_EQ(skew.tiePoints[2].col, 19.5);
-    EXPECT_EQ(skew.tiePoints[2].row, 9.5);
-    EXPECT_EQ(skew.tiePoints[2].x, 21.5);
-    EXPECT_EQ(skew.tiePoints[2].y, 9.0);
-    GeoReference south = geoReferenceOf(summaryOf(sample, 2), notes);
-    EXPECT_EQ(south.system, GeoReference::System::Utm);
-    EXPECT_EQ(south.zone, 32);
-    EXPECT_TRUE(south.southern);
-    EXPECT_TRUE(south.hasGeotransform);
-    EXPECT_NEAR(south.geotransform[1], 100, 1e-9);
-    EXPECT_TRUE(notes.empty());
-
     // The chip (full = 100 + 2 chip in rows, 200 + 2 chip in columns) folds into offsets and scales: the tag
     // puts 45.1 N 10.1 E where the chipped model does, at line -50, sample 400.
     const CRpcSource chipped = modelOf({{"ICHIPB", sampleIchipb()}, {"RPC00B", sampleRpc00b()}});

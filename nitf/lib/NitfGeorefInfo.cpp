@@ -276,12 +276,11 @@ char CNitfGeorefInfo::chooseIcords(const ProjInfo_t* info, eNitfVersion_t versio
     if (!family21 || info->system != PROJ_UTM)
         return 'G';
     // UTM: the hemisphere of the northernmost corner.
-    double northernmost = -90;
+    double col[4], row[4], northernmost = -90;
+    cornerPixels(std::max(info->width, 1), std::max(info->height, 1), col, row);
     for (int i = 0; i < 4; ++i) {
         double x, y, latitude, longitude;
-        const double col = i == 1 || i == 2 ? std::max(info->width - 1, 0) : 0;
-        const double row = i >= 2 ? std::max(info->height - 1, 0) : 0;
-        if (ProjPixelToMap(info, col, row, &x, &y) == 0 &&
+        if (ProjPixelToMap(info, col[i], row[i], &x, &y) == 0 &&
             ProjToGeocoded(info, x, y, &latitude, &longitude) == 0)
             northernmost = std::max(northernmost, latitude);
     }
@@ -370,15 +369,20 @@ void CNitfGeorefInfo::read(FILE* fp, CNitfImageSubheader* subheader, ProjInfo_t*
             ProjInfo_t candidate;
             double slackLatitude = 0, slackLongitude = 0;
             bool found = false;
-            if (source == eCornerSourceRpfCoverage)
+            switch (source) {
+            case eCornerSourceRpfCoverage:
                 found = m_hasCoverage &&
                         geographicRecord(m_coverageLatitude, m_coverageLongitude, width, height, &candidate);
-            else if (subheader && source == eCornerSourceGeolob)
+                break;
+            case eCornerSourceGeolob:
                 // Some producers give the outer edges of the corner pixels in IGEOLO: half a pixel apart.
-                found =
-                    geolobRecord(fp, subheader, width, height, &candidate, &slackLatitude, &slackLongitude);
-            else if (subheader)
-                found = blockaRecord(fp, subheader, width, height, &candidate);
+                found = subheader && geolobRecord(fp, subheader, width, height, &candidate, &slackLatitude,
+                                                  &slackLongitude);
+                break;
+            default:
+                found = subheader && blockaRecord(fp, subheader, width, height, &candidate);
+                break;
+            }
             if (!found)
                 continue;
             int corner = 0;
