@@ -36,6 +36,7 @@ struct Options {
     int band = -1;
     bool cog = false;
     std::string compression;
+    int threads = 0;
 };
 
 class UsageError : public std::runtime_error {
@@ -72,6 +73,8 @@ Options parseOptions(int argc, char** argv) {
             options.cog = true;
         else if (arg == "--compress")
             options.compression = value();
+        else if (arg == "--threads")
+            options.threads = parseIndex(value(), "thread count");
         else if (!arg.empty() && arg[0] == '-')
             throw UsageError("unknown option " + arg);
         else if (options.file.empty())
@@ -84,8 +87,8 @@ Options parseOptions(int argc, char** argv) {
     if (options.format != "raw" && options.format != "png" && options.format != "pgm" &&
         options.format != "tiff")
         throw UsageError("unknown format '" + options.format + "' (raw, png, pgm or tiff)");
-    if ((options.cog || !options.compression.empty()) && options.format != "tiff")
-        throw UsageError("--cog and --compress go with -f tiff");
+    if ((options.cog || !options.compression.empty() || options.threads > 0) && options.format != "tiff")
+        throw UsageError("--cog, --compress and --threads go with -f tiff");
     if (!options.compression.empty() && options.compression != "deflate" && options.compression != "zstd" &&
         options.compression != "none")
         throw UsageError("unknown compression '" + options.compression + "' (deflate, zstd or none)");
@@ -491,6 +494,7 @@ void extractTiff(CNitfFileReader& reader, CNitfImageSource& source, BandReader& 
         tiff.compression = nitfpicture::Compression::Zstd;
     else if (options.compression == "none")
         tiff.compression = nitfpicture::Compression::None;
+    tiff.threads = options.threads;
     ProgressBar bar;
     tiff.progress = [&](double fraction) { bar.update(static_cast<long long>(fraction * 1000), 1000); };
     for (const std::string& note :
@@ -579,7 +583,7 @@ int runExtract(int argc, char** argv) {
         std::fprintf(stderr,
                      "nitf extract: %s\n"
                      "usage: nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm|tiff [--cog]\n"
-                     "                    [--compress deflate|zstd|none] -o OUT\n",
+                     "                    [--compress deflate|zstd|none] [--threads N] -o OUT\n",
                      e.what());
         return 2;
     }

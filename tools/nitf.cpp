@@ -11,7 +11,7 @@ static int usage(FILE* out) {
     std::fprintf(out, "usage: nitf --version\n"
                       "       nitf info [--json] FILE  describe the file's headers, segments and TREs\n"
                       "       nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm|tiff [--cog]\n"
-                      "                    [--compress deflate|zstd|none] -o OUT\n"
+                      "                    [--compress deflate|zstd|none] [--threads N] -o OUT\n"
                       "                                decode an image (default 0) to canonical raw bytes, a "
                       "picture, or a\n"
                       "                                GeoTIFF (--cog: Cloud-Optimized, tiled, compressed, "

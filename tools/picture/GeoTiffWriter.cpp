@@ -8,8 +8,11 @@
 #include <cstdio>
 #include <cstring>
 #include <memory>
+#include <condition_variable>
+#include <deque>
 #include <mutex>
 #include <stdexcept>
+#include <thread>
 
 #include <fcntl.h>
 #include <unistd.h>
@@ -464,14 +467,119 @@ void interleave(const unsigned char* planes, int bands, int rows, int width, int
     }
 }
 
+// Encodes tiles into TIFF files, `files[level][worker]`. With one worker it does so on the calling thread;
+// with more, each worker thread writes into files of its own, so that libtiff's codecs run side by side
+// (a file's tile table then holds the tiles that its worker encoded).
+class TileEncoder {
+public:
+    TileEncoder(std::vector<std::vector<TIFF*>> files, size_t tileBytes)
+        : m_files(std::move(files)), m_tileBytes(tileBytes) {
+        const size_t workers = m_files.empty() ? 1 : m_files[0].size();
+        for (size_t w = 0; workers > 1 && w < workers; ++w)
+            m_workers.emplace_back(&TileEncoder::work, this, w);
+    }
+    ~TileEncoder() { stop(); }
+    TileEncoder(const TileEncoder&) = delete;
+    TileEncoder& operator=(const TileEncoder&) = delete;
+
+    // A buffer for one tile (its earlier contents left in it), to be filled and handed to encode().
+    std::vector<unsigned char> buffer() {
+        std::lock_guard<std::mutex> lock(m_mutex);
+        if (m_spare.empty())
+            return std::vector<unsigned char>(m_tileBytes);
+        std::vector<unsigned char> tile = std::move(m_spare.back());
+        m_spare.pop_back();
+        return tile;
+    }
+
+    void encode(int level, uint32_t index, std::vector<unsigned char> tile) {
+        if (m_workers.empty()) {
+            write(m_files[level][0], index, tile);
+            m_spare.push_back(std::move(tile));
+            return;
+        }
+        std::unique_lock<std::mutex> lock(m_mutex);
+        // A few tiles per worker in waiting keep the workers busy and the memory small.
+        m_space.wait(lock, [&] { return m_jobs.size() < 2 * m_workers.size() || !m_failure.empty(); });
+        if (!m_failure.empty())
+            fail(m_failure);
+        m_jobs.push_back({level, index, std::move(tile)});
+        m_ready.notify_one();
+    }
+
+    // Waits for every tile; throws when one could not be written.
+    void finish() {
+        stop();
+        if (!m_failure.empty())
+            fail(m_failure);
+    }
+
+private:
+    struct Job {
+        int level;
+        uint32_t index;
+        std::vector<unsigned char> tile;
+    };
+
+    static void write(TIFF* tif, uint32_t index, std::vector<unsigned char>& tile) {
+        if (TIFFWriteEncodedTile(tif, index, tile.data(), static_cast<tmsize_t>(tile.size())) < 0)
+            fail("cannot write a tile");
+    }
+
+    void work(size_t worker) {
+        for (;;) {
+            Job job;
+            {
+                std::unique_lock<std::mutex> lock(m_mutex);
+                m_ready.wait(lock, [&] { return !m_jobs.empty() || m_closing; });
+                if (m_jobs.empty())
+                    return;
+                job = std::move(m_jobs.front());
+                m_jobs.pop_front();
+                m_space.notify_one();
+            }
+            try {
+                write(m_files[job.level][worker], job.index, job.tile);
+            } catch (const std::exception& e) {
+                std::lock_guard<std::mutex> lock(m_mutex);
+                if (m_failure.empty())
+                    m_failure = e.what();
+                m_space.notify_all();
+            }
+            std::lock_guard<std::mutex> lock(m_mutex);
+            m_spare.push_back(std::move(job.tile));
+        }
+    }
+
+    void stop() {
+        {
+            std::lock_guard<std::mutex> lock(m_mutex);
+            m_closing = true;
+        }
+        m_ready.notify_all();
+        for (std::thread& worker : m_workers)
+            worker.join();
+        m_workers.clear();
+    }
+
+    std::vector<std::vector<TIFF*>> m_files;
+    size_t m_tileBytes;
+    std::vector<std::thread> m_workers;
+    std::mutex m_mutex;
+    std::condition_variable m_ready, m_space;
+    std::deque<Job> m_jobs;
+    std::vector<std::vector<unsigned char>> m_spare;
+    bool m_closing = false;
+    std::string m_failure;
+};
+
 // One resolution level: a strip of one tile row of pixel-interleaved samples, filled from the source or from
-// the level above, and encoded tile by tile into `tiff`.
+// the level above, and handed tile by tile to the encoder.
 class Level {
 public:
-    Level(const Plan& plan, const LevelSize& size, TIFF* tiff, bool fromSource)
-        : m_plan(plan), m_size(size), m_tiff(tiff), m_fromSource(fromSource),
-          m_rowBytes(static_cast<size_t>(size.width) * plan.pixelBytes), m_strip(m_rowBytes * plan.tile),
-          m_tileBuffer(static_cast<size_t>(plan.tile) * plan.tile * plan.pixelBytes) {}
+    Level(const Plan& plan, const LevelSize& size, TileEncoder& encoder, int index, bool fromSource)
+        : m_plan(plan), m_size(size), m_encoder(encoder), m_index(index), m_fromSource(fromSource),
+          m_rowBytes(static_cast<size_t>(size.width) * plan.pixelBytes), m_strip(m_rowBytes * plan.tile) {}
 
     const LevelSize& size() const { return m_size; }
     bool fromSource() const { return m_fromSource; }
@@ -507,20 +615,18 @@ public:
 
     // Encodes the strip's tiles (padded with zeros at the right and bottom edges) and starts the next strip.
     void encodeStrip() {
-        const int tile = m_plan.tile, tileRow = m_nextRow / tile;
+        const int tile = m_plan.tile, tileRow = m_nextRow / tile,
+                  tilesAcross = (m_size.width + tile - 1) / tile;
         const size_t tileRowBytes = static_cast<size_t>(tile) * m_plan.pixelBytes;
-        for (int x = 0; x * tile < m_size.width; ++x) {
+        for (int x = 0; x < tilesAcross; ++x) {
             const int cols = std::min(tile, m_size.width - x * tile);
             const size_t copied = static_cast<size_t>(cols) * m_plan.pixelBytes;
+            std::vector<unsigned char> buffer = m_encoder.buffer();
             if (cols < tile || m_filled < tile)
-                std::fill(m_tileBuffer.begin(), m_tileBuffer.end(), 0);
+                std::fill(buffer.begin(), buffer.end(), 0);
             for (int r = 0; r < m_filled; ++r)
-                std::memcpy(m_tileBuffer.data() + r * tileRowBytes, row(r) + x * tileRowBytes, copied);
-            const uint32_t index = TIFFComputeTile(m_tiff, static_cast<uint32_t>(x * tile),
-                                                   static_cast<uint32_t>(tileRow * tile), 0, 0);
-            if (TIFFWriteEncodedTile(m_tiff, index, m_tileBuffer.data(),
-                                     static_cast<tmsize_t>(m_tileBuffer.size())) < 0)
-                fail("cannot write a tile");
+                std::memcpy(buffer.data() + r * tileRowBytes, row(r) + x * tileRowBytes, copied);
+            m_encoder.encode(m_index, static_cast<uint32_t>(tileRow * tilesAcross + x), std::move(buffer));
         }
         m_nextRow += m_filled;
         m_filled = 0;
@@ -529,11 +635,11 @@ public:
 private:
     const Plan& m_plan;
     LevelSize m_size;
-    TIFF* m_tiff;
+    TileEncoder& m_encoder;
+    int m_index;
     bool m_fromSource;
     size_t m_rowBytes;
     std::vector<unsigned char> m_strip;
-    std::vector<unsigned char> m_tileBuffer;
     int m_nextRow = 0;
     int m_filled = 0;
 };
@@ -637,14 +743,18 @@ TiffFile scratchTiff(const std::string& outputPath, bool big) {
     return tif;
 }
 
-// The compressed tiles of `from`, in index order, appended to the current directory of `to`.
-void copyTiles(TIFF* from, TIFF* to) {
+// The compressed tiles of a level, in index order, appended to the current directory of `to`: each from
+// the worker file that encoded it.
+void copyTiles(const std::vector<TiffFile>& from, TIFF* to) {
     std::vector<unsigned char> buffer;
-    const uint32_t tiles = TIFFNumberOfTiles(from);
-    const int fd = TIFFFileno(from);
+    const uint32_t tiles = TIFFNumberOfTiles(from[0].get());
     for (uint32_t t = 0; t < tiles; ++t) {
-        const uint64_t size = TIFFGetStrileByteCount(from, t);
-        const uint64_t offset = TIFFGetStrileOffset(from, t);
+        size_t w = 0;
+        while (w + 1 < from.size() && TIFFGetStrileByteCount(from[w].get(), t) == 0)
+            ++w;
+        const uint64_t size = TIFFGetStrileByteCount(from[w].get(), t);
+        const uint64_t offset = TIFFGetStrileOffset(from[w].get(), t);
+        const int fd = TIFFFileno(from[w].get());
         buffer.resize(size);
         size_t got = 0;
         while (got < size) {
@@ -658,36 +768,53 @@ void copyTiles(TIFF* from, TIFF* to) {
     }
 }
 
+size_t tileBytes(const Plan& plan) {
+    return static_cast<size_t>(plan.tile) * plan.tile * plan.pixelBytes;
+}
+
 void writePlain(const std::string& path, RowSource& source, const GeoReference& geo,
                 const TiffOptions& options, const Plan& plan) {
     TiffFile tif = openTiff(path, needsBigTiff(plan, false) ? "w8" : "w");
     setImageTags(tif.get(), plan, plan.levels[0], options, false);
     setGeoTags(tif.get(), geo);
+    TileEncoder encoder({{tif.get()}}, tileBytes(plan));
     std::vector<Level> levels;
-    levels.emplace_back(plan, plan.levels[0], tif.get(), true);
+    levels.emplace_back(plan, plan.levels[0], encoder, 0, true);
     Pyramid(source, plan, options, levels, 1.0).run();
+    encoder.finish();
     check(TIFFWriteDirectory(tif.get()), "cannot write the image directory");
     tif.reset();
 }
 
-// Every level is encoded into a scratch file first; then the output gets every directory at its start, with
-// the tile tables right after them, and the tiles copied as they are, smallest level first, the tables being
-// rewritten in place.
+// Every level is encoded into scratch files first (one per level and worker); then the output gets every
+// directory at its start, with the tile tables right after them, and the tiles copied as they are, smallest
+// level first, the tables being rewritten in place.
 void writeCloudOptimized(const std::string& path, RowSource& source, const GeoReference& geo,
                          const TiffOptions& options, const Plan& plan) {
     const bool big = needsBigTiff(plan, true);
     const int reduced = std::max(0, source.reducedLevels());
-    std::vector<TiffFile> scratch;
+    const unsigned threads = options.threads > 0 ? static_cast<unsigned>(options.threads)
+                                                 : std::max(1u, std::thread::hardware_concurrency());
+    std::vector<std::vector<TiffFile>> scratch(plan.levels.size());
+    std::vector<std::vector<TIFF*>> files(plan.levels.size());
+    for (size_t k = 0; k < plan.levels.size(); ++k) {
+        for (unsigned w = 0; w < threads; ++w) {
+            scratch[k].push_back(scratchTiff(path, big));
+            TIFF* tif = scratch[k].back().get();
+            setImageTags(tif, plan, plan.levels[k], options, k > 0);
+            check(TIFFWriteCheck(tif, 1, "scratch"), "cannot prepare a scratch file");
+            files[k].push_back(tif);
+        }
+    }
+    TileEncoder encoder(files, tileBytes(plan));
     std::vector<Level> levels;
     levels.reserve(plan.levels.size());
-    for (size_t k = 0; k < plan.levels.size(); ++k) {
-        scratch.push_back(scratchTiff(path, big));
-        setImageTags(scratch.back().get(), plan, plan.levels[k], options, k > 0);
-        levels.emplace_back(plan, plan.levels[k], scratch.back().get(),
+    for (size_t k = 0; k < plan.levels.size(); ++k)
+        levels.emplace_back(plan, plan.levels[k], encoder, static_cast<int>(k),
                             k == 0 || static_cast<int>(k) <= reduced);
-    }
     const double encodingShare = 0.9;
     Pyramid(source, plan, options, levels, encodingShare).run();
+    encoder.finish();
 
     {
         // Every directory first, each followed by its tile tables (all zero until the tiles are there).
@@ -702,14 +829,14 @@ void writeCloudOptimized(const std::string& path, RowSource& source, const GeoRe
     }
     TiffFile out = openTiff(path, "r+");
     long long copied = 0, total = 0;
-    for (const TiffFile& level : scratch)
-        total += TIFFNumberOfTiles(level.get());
+    for (const std::vector<TiffFile>& level : scratch)
+        total += TIFFNumberOfTiles(level[0].get());
     for (size_t k = plan.levels.size(); k-- > 0;) {
         check(TIFFSetDirectory(out.get(), static_cast<tdir_t>(k)), "cannot reopen an image directory");
-        copyTiles(scratch[k].get(), out.get());
+        copyTiles(scratch[k], out.get());
         // The tables were written in place: same count and type, now with the offsets.
         check(TIFFForceStrileArrayWriting(out.get()), "cannot complete the tile tables");
-        copied += TIFFNumberOfTiles(scratch[k].get());
+        copied += TIFFNumberOfTiles(scratch[k][0].get());
         if (options.progress)
             options.progress(encodingShare + (1 - encodingShare) * copied / total);
     }
