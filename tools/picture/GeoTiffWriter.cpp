@@ -793,8 +793,9 @@ void writeCloudOptimized(const std::string& path, RowSource& source, const GeoRe
                          const TiffOptions& options, const Plan& plan) {
     const bool big = needsBigTiff(plan, true);
     const int reduced = std::max(0, source.reducedLevels());
+    // Each worker keeps a scratch file per level open: the default stays well within the descriptor limit.
     const unsigned threads = options.threads > 0 ? static_cast<unsigned>(options.threads)
-                                                 : std::max(1u, std::thread::hardware_concurrency());
+                                                 : std::clamp(std::thread::hardware_concurrency(), 1u, 16u);
     std::vector<std::vector<TiffFile>> scratch(plan.levels.size());
     std::vector<std::vector<TIFF*>> files(plan.levels.size());
     for (size_t k = 0; k < plan.levels.size(); ++k) {
