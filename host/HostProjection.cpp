@@ -1,13 +1,15 @@
-// Default host projection service: the projection record, coordinate-system texts, DMS conversions and MGRS
-// (through GeographicLib, which also handles the polar UPS areas).
+// Default host projection service: the projection record, coordinate-system texts, DMS conversions, and the
+// UTM, UPS, MGRS and geocentric conversions on WGS-84 (through GeographicLib).
 #include "HostProjection.h"
 
 #include <cctype>
 #include <cmath>
+#include <cstdio>
 #include <cstring>
 #include <exception>
 #include <string>
 
+#include <GeographicLib/Constants.hpp>
 #include <GeographicLib/MGRS.hpp>
 #include <GeographicLib/UTMUPS.hpp>
 
@@ -39,6 +41,30 @@ int hemisphereAtEnd(const std::string& text, size_t pos) {
     return text[pos] == 'S' ? 1 : text[pos] == 'N' ? 0 : -1;
 }
 
+// UTM's false northing of the southern hemisphere.
+const double kFalseNorthing = 10000000.0;
+
+// WGS-84's first eccentricity squared.
+double eccentricitySquared() {
+    const double f = GeographicLib::Constants::WGS84_f();
+    return f * (2 - f);
+}
+
+// tan(geodetic) = tan(geocentric) / (1 - e²), for points on the ellipsoid; the poles map to themselves.
+double geodeticLatitude(double geocentric) {
+    if (std::fabs(geocentric) >= 90)
+        return geocentric;
+    const double radians = geocentric * M_PI / 180;
+    return std::atan(std::tan(radians) / (1 - eccentricitySquared())) * 180 / M_PI;
+}
+
+double geocentricLatitude(double geodetic) {
+    if (std::fabs(geodetic) >= 90)
+        return geodetic;
+    const double radians = geodetic * M_PI / 180;
+    return std::atan(std::tan(radians) * (1 - eccentricitySquared())) * 180 / M_PI;
+}
+
 bool allFinite(const double values[4]) {
     for (int i = 0; i < 4; ++i)
         if (!std::isfinite(values[i]))
@@ -63,6 +89,8 @@ int DecodeGeosys(ProjInfo_t* info, const char* geosys) {
     int system = PROJ_NONE, zone = 0, southern = 0;
     if (text == "GEO") {
         system = PROJ_GEOGRAPHIC;
+    } else if (text == "GEOCENTRIC") {
+        system = PROJ_GEOCENTRIC;
     } else if (text.compare(0, 3, "UTM") == 0) {
         size_t pos = 3;
         skipBlanks(text, pos);
@@ -92,6 +120,34 @@ int DecodeGeosys(ProjInfo_t* info, const char* geosys) {
     return 0;
 }
 
+int EncodeGeosys(const ProjInfo_t* info, char* text, size_t size) {
+    if (!info || !text || size == 0)
+        return -1;
+    const char hemisphere = info->southern ? 'S' : 'N';
+    int length = -1;
+    switch (info->system) {
+    case PROJ_GEOGRAPHIC:
+        length = std::snprintf(text, size, "GEO");
+        break;
+    case PROJ_GEOCENTRIC:
+        length = std::snprintf(text, size, "GEOCENTRIC");
+        break;
+    case PROJ_UTM:
+        length = std::snprintf(text, size, "UTM %d%c", info->zone, hemisphere);
+        break;
+    case PROJ_UPS:
+        length = std::snprintf(text, size, "UPS %c", hemisphere);
+        break;
+    default:
+        break;
+    }
+    if (length < 0 || static_cast<size_t>(length) >= size) {
+        text[0] = '\0';
+        return -1;
+    }
+    return 0;
+}
+
 int GetEarthModel(const char* name) {
     std::string text = normalized(name);
     if (text == "WGS84" || text == "WGS-84" || text == "WGS 84" || text == "WGE")
@@ -107,6 +163,10 @@ int GeocodedToMGRS(double latitude, double longitude, int precision, char* mgrs)
         bool northern;
         double x, y;
         GeographicLib::UTMUPS::Forward(latitude, longitude, zone, northern, x, y);
+        // MGRS truncates toward the south-west; a point that came from whole metres and went through a
+        // latitude/longitude round trip must not lose a metre to a rounding error a billion times smaller.
+        x = std::round(x * 1e6) / 1e6;
+        y = std::round(y * 1e6) / 1e6;
         std::string text;
         GeographicLib::MGRS::Forward(zone, northern, x, y, latitude, precision, text);
         if (text.size() > 15)
@@ -138,23 +198,151 @@ int ProjSetGeoreferenceFromCorners(ProjInfo_t* info, const double cornerX[4], co
     if (!info || !cornerX || !cornerY || width < 1 || height < 1 || !allFinite(cornerX) ||
         !allFinite(cornerY))
         return -1;
-    enum { UL = 0, UR = 1, LL = 3 }; // NITF corner order; the lower right follows from the other three
-    // The corners are the centres of the corner pixels: UL at (0, 0), UR at (width-1, 0), LL at (0,
-    // height-1). An image one pixel wide or high has no extent along that axis, so its step there is zero.
+    enum { UL = 0, UR = 1, LR = 2, LL = 3 }; // NITF corner order
+    // An image one pixel wide or high has no extent along that axis, so its step there is zero.
     const double lastCol = width - 1, lastRow = height - 1;
     auto step = [](double from, double to, double span) { return span > 0 ? (to - from) / span : 0.0; };
-    info->affine[0] = cornerX[UL];
-    info->affine[1] = step(cornerX[UL], cornerX[UR], lastCol);
-    info->affine[2] = step(cornerX[UL], cornerX[LL], lastRow);
-    info->affine[3] = cornerY[UL];
-    info->affine[4] = step(cornerY[UL], cornerY[UR], lastCol);
-    info->affine[5] = step(cornerY[UL], cornerY[LL], lastRow);
+    double* a = info->affine;
+    a[0] = cornerX[UL];
+    a[1] = step(cornerX[UL], cornerX[UR], lastCol);
+    a[2] = step(cornerX[UL], cornerX[LL], lastRow);
+    a[3] = cornerY[UL];
+    a[4] = step(cornerY[UL], cornerY[UR], lastCol);
+    a[5] = step(cornerY[UL], cornerY[LL], lastRow);
+
+    // How far, in pixels, the given last corner lies from where the transform puts it.
+    const double missX = cornerX[LR] - (a[0] + a[1] * lastCol + a[2] * lastRow);
+    const double missY = cornerY[LR] - (a[3] + a[4] * lastCol + a[5] * lastRow);
+    const double determinant = a[1] * a[5] - a[2] * a[4];
+    bool parallelogram;
+    if (determinant != 0) {
+        const double missCol = (missX * a[5] - missY * a[2]) / determinant;
+        const double missRow = (missY * a[1] - missX * a[4]) / determinant;
+        parallelogram = std::fabs(missCol) <= 0.5 && std::fabs(missRow) <= 0.5;
+    } else {
+        // No pixel size to measure with (a single row or column): only an exact fit will do.
+        const double scale = std::fabs(cornerX[UL]) + std::fabs(cornerY[UL]) + 1;
+        parallelogram = std::fabs(missX) + std::fabs(missY) <= 1e-12 * scale;
+    }
+    info->hasAffine = parallelogram ? 1 : 0;
     for (int i = 0; i < 4; ++i) {
         info->cornerX[i] = cornerX[i];
         info->cornerY[i] = cornerY[i];
     }
+    info->width = width;
+    info->height = height;
     info->hasCorners = 1;
     return 0;
+}
+
+int ProjPixelToMap(const ProjInfo_t* info, double col, double row, double* x, double* y) {
+    if (!info || !x || !y)
+        return -1;
+    if (info->hasCorners && info->width >= 1 && info->height >= 1) {
+        // Bilinear in the corners: exact at the corners themselves, and the affine map for a parallelogram.
+        const double u = info->width > 1 ? col / (info->width - 1) : 0;
+        const double v = info->height > 1 ? row / (info->height - 1) : 0;
+        const double w[4] = {(1 - u) * (1 - v), u * (1 - v), u * v, (1 - u) * v};
+        *x = *y = 0;
+        for (int i = 0; i < 4; ++i) {
+            *x += w[i] * info->cornerX[i];
+            *y += w[i] * info->cornerY[i];
+        }
+        return 0;
+    }
+    if (info->hasAffine) {
+        const double* a = info->affine;
+        *x = a[0] + a[1] * col + a[2] * row;
+        *y = a[3] + a[4] * col + a[5] * row;
+        return 0;
+    }
+    return -1;
+}
+
+int ProjToGeocoded(const ProjInfo_t* info, double x, double y, double* latitude, double* longitude) {
+    if (!info || !latitude || !longitude || info->earthModel != EARTH_WGS84 || !std::isfinite(x) ||
+        !std::isfinite(y))
+        return -1;
+    try {
+        switch (info->system) {
+        case PROJ_GEOGRAPHIC:
+            if (std::fabs(y) > 90)
+                return -1;
+            *latitude = y;
+            *longitude = x;
+            return 0;
+        case PROJ_GEOCENTRIC:
+            if (std::fabs(y) > 90)
+                return -1;
+            *latitude = geodeticLatitude(y);
+            *longitude = x;
+            return 0;
+        case PROJ_UTM: {
+            if (info->zone < 1 || info->zone > 60)
+                return -1;
+            // A northing outside the record's hemisphere belongs to the other one.
+            bool northern = !info->southern;
+            if (northern && y < 0) {
+                northern = false;
+                y += kFalseNorthing;
+            } else if (!northern && y >= kFalseNorthing) {
+                northern = true;
+                y -= kFalseNorthing;
+            }
+            GeographicLib::UTMUPS::Reverse(info->zone, northern, x, y, *latitude, *longitude);
+            return 0;
+        }
+        case PROJ_UPS:
+            GeographicLib::UTMUPS::Reverse(GeographicLib::UTMUPS::UPS, !info->southern, x, y, *latitude,
+                                           *longitude);
+            return 0;
+        default:
+            return -1;
+        }
+    } catch (const std::exception&) {
+        return -1;
+    }
+}
+
+int GeocodedToProj(const ProjInfo_t* info, double latitude, double longitude, double* x, double* y) {
+    if (!info || !x || !y || info->earthModel != EARTH_WGS84 || !std::isfinite(latitude) ||
+        !std::isfinite(longitude) || std::fabs(latitude) > 90)
+        return -1;
+    try {
+        switch (info->system) {
+        case PROJ_GEOGRAPHIC:
+            *x = longitude;
+            *y = latitude;
+            return 0;
+        case PROJ_GEOCENTRIC:
+            *x = longitude;
+            *y = geocentricLatitude(latitude);
+            return 0;
+        case PROJ_UTM: {
+            if (info->zone < 1 || info->zone > 60)
+                return -1;
+            int zone;
+            bool northern;
+            GeographicLib::UTMUPS::Forward(latitude, longitude, zone, northern, *x, *y, info->zone);
+            if (northern && info->southern)
+                *y += kFalseNorthing;
+            else if (!northern && !info->southern)
+                *y -= kFalseNorthing;
+            return 0;
+        }
+        case PROJ_UPS: {
+            int zone;
+            bool northern;
+            GeographicLib::UTMUPS::Forward(latitude, longitude, zone, northern, *x, *y,
+                                           GeographicLib::UTMUPS::UPS);
+            return northern == !info->southern ? 0 : -1;
+        }
+        default:
+            return -1;
+        }
+    } catch (const std::exception&) {
+        return -1;
+    }
 }
 
 double DMSToDec(int degrees, int minutes, double seconds, int negative) {

@@ -7,7 +7,7 @@ packages=(
     build-essential cmake pkg-config git ca-certificates xz-utils dpkg-dev
     clang libclang-rt-14-dev nasm
     libgtest-dev libgmock-dev libbenchmark-dev
-    libopenjp2-7-dev libopenjp2-tools libgeographiclib-dev libpng-dev libtiff-dev zlib1g-dev
+    libopenjp2-7-dev libopenjp2-tools libgeographiclib-dev libpng-dev libtiff-dev libgeotiff-dev zlib1g-dev
     python3 nlohmann-json3-dev
 )
 

@@ -481,3 +481,70 @@ TEST(HostFile, SizeOfAReadStreamDoesNotGrowBySeeking) {
     EXPECT_EQ(DKSize(out), 3) << "bytes written and not yet flushed count";
     DKClose(out);
 }
+
+TEST(HostProjection, AffineOnlyForParallelogramsAndPixelPositions) {
+    ProjInfo_t info;
+    InitProjInfo(&info);
+    // 11 x 11 pixels of 10 units: a last corner 4 units (0.4 pixel) off still fits the transform, 6 do not.
+    const double x[4] = {0, 100, 104, 0}, y[4] = {100, 100, 0, 0};
+    ASSERT_EQ(ProjSetGeoreferenceFromCorners(&info, x, y, 11, 11), 0);
+    EXPECT_EQ(info.hasAffine, 1);
+    const double far[4] = {0, 100, 106, 0};
+    ASSERT_EQ(ProjSetGeoreferenceFromCorners(&info, far, y, 11, 11), 0);
+    EXPECT_EQ(info.hasAffine, 0);
+    EXPECT_EQ(info.width, 11);
+
+    // Positions come from the corners, bilinearly: exact at the corners, extrapolated beyond them.
+    double px, py;
+    ASSERT_EQ(ProjPixelToMap(&info, 10, 10, &px, &py), 0);
+    EXPECT_EQ(px, 106);
+    EXPECT_EQ(py, 0);
+    ASSERT_EQ(ProjPixelToMap(&info, 5, 5, &px, &py), 0);
+    EXPECT_DOUBLE_EQ(px, 51.5);
+    EXPECT_DOUBLE_EQ(py, 50);
+    ASSERT_EQ(ProjPixelToMap(&info, 20, 0, &px, &py), 0);
+    EXPECT_DOUBLE_EQ(px, 200);
+
+    // A record given only a transform uses it.
+    ProjInfo_t affine;
+    InitProjInfo(&affine);
+    EXPECT_EQ(ProjPixelToMap(&affine, 0, 0, &px, &py), -1);
+    affine.hasAffine = 1;
+    const double a[6] = {1, 2, 3, 4, 5, 6};
+    std::copy(a, a + 6, affine.affine);
+    ASSERT_EQ(ProjPixelToMap(&affine, 10, 100, &px, &py), 0);
+    EXPECT_EQ(px, 1 + 20 + 300);
+    EXPECT_EQ(py, 4 + 50 + 600);
+}
+
+TEST(HostProjection, UtmHemispheresGeocentricLatitudeAndGeosysTexts) {
+    ProjInfo_t utm;
+    InitProjInfo(&utm);
+    ASSERT_EQ(DecodeGeosys(&utm, "UTM 17N"), 0);
+    char text[16];
+    ASSERT_EQ(EncodeGeosys(&utm, text, sizeof text), 0);
+    EXPECT_STREQ(text, "UTM 17N");
+    // A point south of the equator in a northern record has a negative northing, and comes back.
+    double latitude, longitude, x, y;
+    ASSERT_EQ(GeocodedToProj(&utm, -0.5, -81, &x, &y), 0);
+    EXPECT_LT(y, 0);
+    ASSERT_EQ(ProjToGeocoded(&utm, x, y, &latitude, &longitude), 0);
+    EXPECT_NEAR(latitude, -0.5, 1e-9);
+    // Geocentric latitude: the equator and the poles stay, 45 degrees moves by about 11.5'.
+    ProjInfo_t geocentric;
+    InitProjInfo(&geocentric);
+    ASSERT_EQ(DecodeGeosys(&geocentric, "GEOCENTRIC"), 0);
+    for (double pole : {-90.0, 0.0, 90.0}) {
+        ASSERT_EQ(ProjToGeocoded(&geocentric, 0, pole, &latitude, &longitude), 0);
+        EXPECT_EQ(latitude, pole);
+    }
+    ASSERT_EQ(ProjToGeocoded(&geocentric, 0, 45, &latitude, &longitude), 0);
+    EXPECT_NEAR((latitude - 45) * 60, 11.5, 0.1);
+
+    utm.earthModel = EARTH_UNKNOWN;
+    EXPECT_EQ(ProjToGeocoded(&utm, 233085, 3807070, &latitude, &longitude), -1);
+    ProjInfo_t none;
+    InitProjInfo(&none);
+    EXPECT_EQ(ProjToGeocoded(&none, 0, 0, &latitude, &longitude), -1);
+    EXPECT_EQ(EncodeGeosys(&none, text, sizeof text), -1);
+}

@@ -152,7 +152,7 @@ TEST(ExtractTool, WritesCanonicalSamplesAndPictures) {
     ASSERT_EQ(runTool("extract " + input.path() + " -b 2 -f pgm -o " + output.path()), 0);
     EXPECT_EQ(output.read().substr(0, 3), "P5\n");
 
-    EXPECT_EQ(runTool("extract " + input.path() + " -f tiff -o " + output.path()), 2);
+    EXPECT_EQ(runTool("extract " + input.path() + " -f bmp -o " + output.path()), 2);
     EXPECT_EQ(runTool("extract " + input.path()), 2);
     EXPECT_EQ(runTool("extract " + input.path() + " -b 3 -f raw -o " + output.path()), 1);
     EXPECT_EQ(runTool("extract " + input.path() + " -i 1 -f raw -o " + output.path()), 1);

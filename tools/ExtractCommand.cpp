@@ -19,6 +19,7 @@
 #include "HostError.h"
 #include "NitfFileReader.h"
 #include "NitfImageSource.h"
+#include "NitfGeoTiff.h"
 #include "OutputFile.h"
 #include "PictureView.h"
 #include "ProgressBar.h"
@@ -27,12 +28,17 @@
 namespace {
 
 const char kUsage[] =
-    "usage: nitf extract FILE -f raw|png|pgm -o OUT [options]\n"
+    "usage: nitf extract FILE -f raw|png|pgm|tiff -o OUT [options]\n"
     "\n"
-    "Decodes an image segment. raw: the canonical samples, band after band, each band's rows top first, "
-    "each\n"
-    "sample in ceil(NBPP/8) bytes big-endian as stored (0 or 1 for NBPP 1). png, pgm: a picture for looking\n"
-    "at (look-up tables applied, three bands as RGB). OUT may be - for standard output.\n"
+    "Decodes an image segment.\n"
+    "  raw   the canonical samples: band after band, each band's rows top first, each sample in\n"
+    "        ceil(NBPP/8) bytes big-endian as stored (0 or 1 for NBPP 1)\n"
+    "  png   a picture for looking at (look-up tables applied, three bands as RGB); pgm: the same as "
+    "PGM/PPM\n"
+    "  tiff  a GeoTIFF of the samples in their own types, with the image's corners, RPC model, colour map "
+    "and\n"
+    "        pad value (the whole image, into a file)\n"
+    "OUT may be - for standard output (raw, png, pgm).\n"
     "\n"
     "  -i, --image N          image segment, from 0 (default 0)\n"
     "  -b, --band N           one band, from 0\n"
@@ -40,7 +46,9 @@ const char kUsage[] =
     "      --window X,Y,W,H   part of the image: W x H pixels from column X, row Y\n"
     "      --level N          a reduced resolution level (JPEG 2000): the image halved N times; the window\n"
     "                         is at that level\n"
-    "  -j, --threads N        decoding threads for raw output to a file (default: the processors)\n"
+    "  -j, --threads N        decoding (raw) or compressing (tiff) threads (default: the processors)\n"
+    "      --cog              tiff: Cloud-Optimized (tiled, compressed, internal overviews)\n"
+    "      --compress C       tiff: deflate (the default), zstd or none\n"
     "      --allow-partial    exit 0 even when blocks could not be decoded (they are written as zeros)\n"
     "  -h, --help             this text\n";
 
@@ -59,6 +67,8 @@ struct Options {
     int threads = 0;
     int level = 0;
     bool allowPartial = false;
+    bool cog = false;
+    std::string compression;
 };
 
 int parseNumber(const std::string& text, const char* what) {
@@ -82,7 +92,7 @@ std::vector<int> parseList(const std::string& text, const char* what) {
 }
 
 Options parseOptions(int argc, char** argv) {
-    enum { kBands = 1000, kWindow, kLevel, kAllowPartial };
+    enum { kBands = 1000, kWindow, kLevel, kAllowPartial, kCog, kCompress };
     static const option longOptions[] = {{"image", required_argument, nullptr, 'i'},
                                          {"band", required_argument, nullptr, 'b'},
                                          {"bands", required_argument, nullptr, kBands},
@@ -92,6 +102,8 @@ Options parseOptions(int argc, char** argv) {
                                          {"output", required_argument, nullptr, 'o'},
                                          {"threads", required_argument, nullptr, 'j'},
                                          {"allow-partial", no_argument, nullptr, kAllowPartial},
+                                         {"cog", no_argument, nullptr, kCog},
+                                         {"compress", required_argument, nullptr, kCompress},
                                          {"help", no_argument, nullptr, 'h'},
                                          {nullptr, 0, nullptr, 0}};
     // getopt wants the program's name first.
@@ -136,6 +148,12 @@ Options parseOptions(int argc, char** argv) {
         case kAllowPartial:
             options.allowPartial = true;
             break;
+        case kCog:
+            options.cog = true;
+            break;
+        case kCompress:
+            options.compression = optarg;
+            break;
         case 'h':
             throw UsageError("");
         case ':':
@@ -151,11 +169,26 @@ Options parseOptions(int argc, char** argv) {
     }
     if (options.file.empty() || options.output.empty() || options.format.empty())
         throw UsageError("FILE, -f and -o are required");
-    if (options.format != "raw" && options.format != "png" && options.format != "pgm")
-        throw UsageError("unknown format '" + options.format + "' (raw, png or pgm)");
+    if (options.format != "raw" && options.format != "png" && options.format != "pgm" &&
+        options.format != "tiff")
+        throw UsageError("unknown format '" + options.format + "' (raw, png, pgm or tiff)");
+    if ((options.cog || !options.compression.empty()) && options.format != "tiff")
+        throw UsageError("--cog and --compress go with -f tiff");
+    if (!options.compression.empty() && options.compression != "deflate" && options.compression != "zstd" &&
+        options.compression != "none")
+        throw UsageError("unknown compression '" + options.compression + "' (deflate, zstd or none)");
+    if (options.format == "tiff" && (options.output == "-" || options.window.width > 0 || options.level > 0))
+        throw UsageError("a GeoTIFF is of the whole image, at full resolution, into a file");
     if (options.threads == 0)
         options.threads = static_cast<int>(std::max(1u, std::thread::hardware_concurrency()));
     return options;
+}
+
+CNitfImageSource* openImage(CNitfFileReader& reader, int image) {
+    if (image >= reader.getImageCount())
+        throw std::runtime_error("the file has " + std::to_string(reader.getImageCount()) +
+                                 " image segment(s); there is no image " + std::to_string(image));
+    return reader.getNewImageSource(image);
 }
 
 // Library warnings on stderr, naming the file, each once (several decoding threads meet the same causes).
@@ -178,8 +211,33 @@ private:
     std::set<std::string> m_seen;
 };
 
+// The GeoTIFF writer makes the file itself (it lays out a COG in a second pass).
+int extractTiff(const Options& options) {
+    CNitfFileReader reader;
+    if (!reader.open(options.file.c_str()))
+        throw std::runtime_error("cannot open the file");
+    std::unique_ptr<CNitfImageSource> source(openImage(reader, options.image));
+    nitfpicture::TiffOptions tiff;
+    tiff.cog = options.cog;
+    if (options.compression == "zstd")
+        tiff.compression = nitfpicture::Compression::Zstd;
+    else if (options.compression == "none")
+        tiff.compression = nitfpicture::Compression::None;
+    else if (options.compression == "deflate")
+        tiff.compression = nitfpicture::Compression::Deflate;
+    tiff.threads = options.threads;
+    ProgressBar bar("writing");
+    tiff.progress = [&](double fraction) { bar.update(static_cast<long long>(fraction * 1000), 1000); };
+    for (const std::string& note :
+         nitfpicture::writeImageGeoTiff(reader, *source, options.bands, options.output, tiff))
+        std::fprintf(stderr, "nitf extract: %s: note: %s\n", options.file.c_str(), note.c_str());
+    return 0;
+}
+
 int extract(const Options& options) {
     WarningsOnStderr warnings(options.file);
+    if (options.format == "tiff")
+        return extractTiff(options);
     OutputFile out(options.output);
     ProgressBar bar;
     const nitfextract::Progress progress = [&](long long done, long long total) { bar.update(done, total); };
@@ -198,10 +256,7 @@ int extract(const Options& options) {
         CNitfFileReader reader;
         if (!reader.open(options.file.c_str()))
             throw std::runtime_error("cannot open the file");
-        if (options.image >= reader.getImageCount())
-            throw std::runtime_error("the file has " + std::to_string(reader.getImageCount()) +
-                                     " image segment(s); there is no image " + std::to_string(options.image));
-        std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(options.image));
+        std::unique_ptr<CNitfImageSource> source(openImage(reader, options.image));
         outcome = writePicture(reader, *source, options.window, options.bands, options.level,
                                options.format == "png", out.get(), progress);
     }

@@ -67,7 +67,9 @@ public:
     virtual __int64 computeStorageLength();
     virtual bool validateParameters(FILE* fp);
     virtual void readStart(FILE* fp, long long dataOffset, long long dataLength);
-    virtual void readProjection(FILE* fp, ProjInfo_t* info, bool flag);
+    // Georeferencing into the host's record: see CNitfGeorefInfo::read (`precise`: take the most precise
+    // corners present) and CNitfGeorefInfo::write.
+    virtual void readProjection(FILE* fp, ProjInfo_t* info, bool precise);
     // One whole block, pixel-interleaved, `rowBytes` apart; false when the block is absent or cannot be read.
     virtual bool readTileInterleaved(CNitfFile* file, char* buffer, int rowBytes, int x, int y);
     // One band of one block, `rowBytes` apart; false when the block is absent or cannot be read.

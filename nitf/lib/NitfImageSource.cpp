@@ -143,17 +143,18 @@ void CNitfImageSource::writeStart(FILE*, long long, long long) {
     allocateTileOffsets();
 }
 
-// The georeferencing bridge. The sub-header's CNitfGeorefInfo reads the corners into the host record with
-// the actual image size (NCOLS x NROWS) and writes them with the block-padded size (NBPR x NPPBH, NBPC x
-// NPPBV). Until it can, both say so rather than silently leaving the record as it was.
-void CNitfImageSource::readProjection(FILE*, ProjInfo_t*, bool) {
-    NITF_RAISE("Reading georeferencing into a projection record is not yet supported by this build",
-               "void __cdecl CNitfImageSource::readProjection(" NITF_FILE_SIG ",struct ProjInfo_t *,bool)");
+// The georeferencing bridge: corners are read for the actual image (NCOLS x NROWS) and written for the
+// block-padded one (NBPR x NPPBH, NBPC x NPPBV). The asymmetry is deliberate and kept.
+void CNitfImageSource::readProjection(FILE* fp, ProjInfo_t* info, bool precise) {
+    if (m_subheader)
+        m_subheader->getGeorefSource().read(fp, m_subheader, info, m_properties.getImageActualWidth(),
+                                            m_properties.getImageActualHeight(), precise);
 }
 
-void CNitfImageSource::writeProjection(FILE*, ProjInfo_t*) {
-    NITF_RAISE("Writing georeferencing from a projection record is not yet supported by this build",
-               "void __cdecl CNitfImageSource::writeProjection(" NITF_FILE_SIG ",struct ProjInfo_t *)");
+void CNitfImageSource::writeProjection(FILE* fp, ProjInfo_t* info) {
+    if (m_subheader)
+        m_subheader->getGeorefSource().write(fp, info, m_properties.getImageWidth(),
+                                             m_properties.getImageHeight());
 }
 
 bool CNitfImageSource::readBitmap(char*, int, int, int, int, int, int) {

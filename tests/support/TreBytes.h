@@ -22,3 +22,10 @@ std::unique_ptr<CNitfExtension> parseTre(const char* name, const std::string& fi
 // The text of the property `key` (exactly `width` bytes when given), or "<absent>".
 std::string field(CNitfExtension& extension, const char* key, size_t width = 0);
 bool hasField(CNitfExtension& extension, const char* key);
+
+// RPC00B data of a simple model: line = 500 - 500 P, sample = 500 + 500 L, with P = (lat - 45) / 0.1 and
+// L = (lon - 10) / 0.1 (so 45.1 N 10.1 E is line 0, sample 1000), valid, errors 1.00 and 0.50 m.
+std::string sampleRpc00b();
+// ICHIPB data of a chip at twice its full image's pixel size: full row = 100 + 2 chip row, full column = 200
+// + 2 chip column, in the grid points' coordinates.
+std::string sampleIchipb();

@@ -250,8 +250,8 @@ PictureFormat pictureFormat(View& view, int width, int height, int bits, bool pn
 } // namespace
 
 nitfextract::Outcome writePicture(CNitfFileReader& reader, CNitfImageSource& source,
-                                  const nitfextract::Window& requested, const std::vector<int>& bands, int level,
-                                  bool png, FILE* out, const nitfextract::Progress& progress) {
+                                  const nitfextract::Window& requested, const std::vector<int>& bands,
+                                  int level, bool png, FILE* out, const nitfextract::Progress& progress) {
     CNitfRegionReader region(&reader, &source);
     region.setBigEndian(true); // the canonical bytes sampleValue reads
     region.setLevel(level);
