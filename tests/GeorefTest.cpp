@@ -615,7 +615,7 @@ TEST(GeorefCorpus, PreciseCornersAgreeWithIgeoloWithinItsPrecision) {
     if (images.empty())
         GTEST_SKIP() << "no test corpus";
     CapturedWarnings warnings;
-    int blocka = 0, geolob = 0;
+    int blocka = 0, geolob = 0, coverage = 0;
     for (const CorpusImage& image : images) {
         SCOPED_TRACE(image.relative);
         CNitfFileReader reader;
@@ -635,7 +635,11 @@ TEST(GeorefCorpus, PreciseCornersAgreeWithIgeoloWithinItsPrecision) {
             EXPECT_EQ(used, CNitfGeorefInfo::eCornerSourceIgeolo);
             continue;
         }
-        if (has("GEOLOB")) {
+        if (has("RPFIMG")) {
+            // The coverage section of an RPF frame.
+            EXPECT_EQ(used, CNitfGeorefInfo::eCornerSourceRpfCoverage);
+            ++coverage;
+        } else if (has("GEOLOB")) {
             EXPECT_EQ(used, CNitfGeorefInfo::eCornerSourceGeolob);
             ++geolob;
         } else if (has("BLOCKA")) {
@@ -666,4 +670,5 @@ TEST(GeorefCorpus, PreciseCornersAgreeWithIgeoloWithinItsPrecision) {
     }
     EXPECT_EQ(blocka, 4);
     EXPECT_EQ(geolob, 5);
+    EXPECT_EQ(coverage, 4);
 }

@@ -51,8 +51,9 @@ public:
     __int64 getIgeoloOffset() const { return m_igeoloOffset; }
     void setIgeoloOffset(__int64 offset) { m_igeoloOffset = offset; }
 
-    // The corners of an RPF frame's coverage (CADRG, CIB), in NITF corner order, degrees on WGS-84: once set,
-    // a precise read takes them in place of IGEOLO.
+    // The corners of an RPF frame's coverage (CADRG, CIB), in NITF corner order, degrees on WGS-84: once set
+    // (a precise read sets them from the image's RPFIMG coverage section), a precise read takes them in place
+    // of IGEOLO.
     void setCoverageCorners(const double latitude[4], const double longitude[4]);
     bool hasCoverageCorners() const { return m_hasCoverage; }
 
@@ -77,6 +78,9 @@ public:
     CRpcSource* getNewSensorModel(FILE* fp, CNitfImageSubheader* subheader) const;
 
 private:
+    // Sets the coverage corners from the RPFIMG coverage section of the sub-header; false without one.
+    bool coverageOfFrame(FILE* fp, CNitfImageSubheader& subheader);
+
     eCoordinateType_t m_type;
     __int64 m_igeoloOffset;
     eCornerSource_t m_cornerSource;

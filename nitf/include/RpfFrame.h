@@ -3,6 +3,7 @@
 // stands for no data, and the geographic location code of its south-west corner.
 #pragma once
 
+#include <cstdio>
 #include <string>
 #include <vector>
 
@@ -51,9 +52,12 @@ public:
     int getTransparentCode() const { return m_transparentCode; }
     bool isTransparentCodeStored() const { return m_transparentCodeStored; }
 
+    // The coverage section carried in the RPFIMG TRE of an image sub-header read from `fp`; false when there
+    // is none.
+    static bool readCoverage(FILE* fp, CNitfImageSubheader& subheader, RpfCoverage_t& coverage);
+
 private:
     void readHeader(CNitfFileReader& reader);
-    void readCoverage(CNitfFileReader& reader, CNitfImageSubheader& subheader);
     void readColours(CNitfFileReader& reader, CNitfImageSubheader& subheader);
     void readTransparentCode(CNitfFileReader& reader, int image);
 

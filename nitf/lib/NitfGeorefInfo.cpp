@@ -16,6 +16,7 @@
 #include "NitfTag.h"
 #include "Raise.h"
 #include "RpcSource.h"
+#include "RpfFrame.h"
 
 static const char kSourceFile[] = "nitf/lib/NitfGeorefInfo";
 
@@ -287,6 +288,22 @@ char CNitfGeorefInfo::chooseIcords(const ProjInfo_t* info, eNitfVersion_t versio
     return northernmost >= 0 ? 'N' : 'S';
 }
 
+bool CNitfGeorefInfo::coverageOfFrame(FILE* fp, CNitfImageSubheader& subheader) {
+    RpfCoverage_t c;
+    try {
+        if (!CRpfFrame::readCoverage(fp, subheader, c))
+            return false;
+    } catch (const vexo::Exception&) {
+        return false; // a damaged RPFIMG: IGEOLO serves
+    }
+    const double latitude[4] = {c.upperLeftLatitude, c.upperRightLatitude, c.lowerRightLatitude,
+                                c.lowerLeftLatitude};
+    const double longitude[4] = {c.upperLeftLongitude, c.upperRightLongitude, c.lowerRightLongitude,
+                                 c.lowerLeftLongitude};
+    setCoverageCorners(latitude, longitude);
+    return true;
+}
+
 void CNitfGeorefInfo::setCoverageCorners(const double latitude[4], const double longitude[4]) {
     std::memcpy(m_coverageLatitude, latitude, sizeof m_coverageLatitude);
     std::memcpy(m_coverageLongitude, longitude, sizeof m_coverageLongitude);
@@ -371,7 +388,7 @@ void CNitfGeorefInfo::read(FILE* fp, CNitfImageSubheader* subheader, ProjInfo_t*
             bool found = false;
             switch (source) {
             case eCornerSourceRpfCoverage:
-                found = m_hasCoverage &&
+                found = (m_hasCoverage || (subheader && coverageOfFrame(fp, *subheader))) &&
                         geographicRecord(m_coverageLatitude, m_coverageLongitude, width, height, &candidate);
                 break;
             case eCornerSourceGeolob:

@@ -48,7 +48,7 @@ CRpfFrame::CRpfFrame(CNitfFileReader& reader, int image)
         reader.getFileHeader()->getNewImageSubheader(reader.getInputStream(), image));
     if (!subheader)
         NITF_RAISE("Invalid image index", signature);
-    readCoverage(reader, *subheader);
+    m_hasCoverage = readCoverage(reader.getInputStream(), *subheader, m_coverage);
     readColours(reader, *subheader);
     readTransparentCode(reader, image);
 }
@@ -61,22 +61,22 @@ void CRpfFrame::readHeader(CNitfFileReader& reader) {
     CRpfSource::readHeaderSection(reader.getInputStream(), tag->getDataOffset(), m_header);
 }
 
-void CRpfFrame::readCoverage(CNitfFileReader& reader, CNitfImageSubheader& subheader) {
+bool CRpfFrame::readCoverage(FILE* fp, CNitfImageSubheader& subheader, RpfCoverage_t& coverage) {
     std::unique_ptr<CRPFIMGExtension> sections(subheader.getRpfImgExtension());
     if (!sections)
-        return;
-    sections->readNewInfo(reader.getInputStream(), false);
+        return false;
+    sections->readNewInfo(fp, false);
     double values[std::size(kCoverageFields)];
     for (size_t i = 0; i < std::size(kCoverageFields); ++i) {
         CNitfProperty* field = FindProperty(sections->getProperties(), kCoverageFields[i]);
         if (!field)
-            return; // the TRE does not carry the coverage section
+            return false; // the TRE does not carry the coverage section
         const unsigned long long bits = CNitfExtension::getBinaryValue(field, 8);
         std::memcpy(&values[i], &bits, sizeof(double));
     }
     static_assert(sizeof(RpfCoverage_t) == sizeof values, "the coverage is its twelve values");
-    std::memcpy(&m_coverage, values, sizeof values);
-    m_hasCoverage = true;
+    std::memcpy(&coverage, values, sizeof values);
+    return true;
 }
 
 void CRpfFrame::readColours(CNitfFileReader& reader, CNitfImageSubheader& subheader) {
