@@ -160,3 +160,25 @@ TEST(ExtractTool, WritesCanonicalSamplesAndPictures) {
     EXPECT_EQ(runTool("extract " + input.path() + "-missing -f raw -o " + output.path()), 1);
     EXPECT_FALSE(std::ifstream(output.path()).good()) << "no output is left behind after a failure";
 }
+
+// A CADRG frame as a picture: its colour table as the palette, absent subframes (the pad pixel, the first
+// code past the 216 colours) transparent.
+TEST(ExtractTool, CadrgFramesAreColouredWithNoDataClear) {
+    const std::string root = corpusRoot();
+    if (root.empty())
+        GTEST_SKIP() << "no test corpus";
+    TempFile picture("", ".png");
+    ASSERT_EQ(runTool("extract " + root + "/rpf/0000M033.GN3 -f png -o " + picture.path()), 0);
+    const std::string png = picture.read();
+    const size_t palette = png.find("PLTE"), transparency = png.find("tRNS");
+    ASSERT_NE(palette, std::string::npos);
+    ASSERT_NE(transparency, std::string::npos);
+    auto length = [&](size_t type) {
+        const unsigned char* p = reinterpret_cast<const unsigned char*>(png.data() + type - 4);
+        return (size_t(p[0]) << 24) | (size_t(p[1]) << 16) | (size_t(p[2]) << 8) | p[3];
+    };
+    EXPECT_EQ(length(palette), 3u * 256) << "a palette entry for every code";
+    ASSERT_EQ(length(transparency), 217u) << "opaque colours, then the transparent code 216";
+    EXPECT_EQ(static_cast<unsigned char>(png[transparency + 4 + 215]), 255);
+    EXPECT_EQ(static_cast<unsigned char>(png[transparency + 4 + 216]), 0);
+}

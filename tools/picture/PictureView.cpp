@@ -28,6 +28,7 @@ struct View {
     std::vector<unsigned char> table; // LookUp: entries interleaved, `tableComponents` bytes each
     int tableComponents = 0;
     bool paletted = false;
+    int transparent = -1; // LookUp: the sample value that stands for no data (the pad pixel), shown clear
 };
 
 std::string fieldText(CNitfImageSubheader* subheader, const char* name) {
@@ -126,6 +127,8 @@ View chooseView(CNitfFileReader& reader, CNitfImageSource& source, const std::ve
     if (view.bands.size() == 1 && unsignedInts && bits <= 16 &&
         readLut(reader, source, view.bands[0], view)) {
         view.kind = View::LookUp;
+        if (source.hasPadPixel() && source.getPadPixelValue() >= 0 && source.getPadPixelValue() < 256)
+            view.transparent = static_cast<int>(source.getPadPixelValue());
     } else if (bits == 1) {
         view.kind = View::Bilevel;
     } else if (unsignedInts && bits <= 16) {
@@ -238,6 +241,9 @@ PictureFormat pictureFormat(View& view, int width, int height, int bits, bool pn
             view.paletted = true;
             format.palette = view.table;
             format.palette.resize(3 * (size_t(1) << bits), 0);
+            // An RPF frame's transparent code (its pad pixel): clear in the picture.
+            if (view.transparent >= 0 && view.transparent < (1 << bits))
+                format.transparentIndex = view.transparent;
         } else {
             format.channels = view.tableComponents == 3 ? 3 : 1;
         }
