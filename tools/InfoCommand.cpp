@@ -71,9 +71,9 @@ std::string format(const char* fmt, long long a, long long b = 0, long long c = 
     return text;
 }
 
-void addFields(Section& section, PropertyMap& map, const std::vector<const char*>& names) {
-    for (const char* name : names)
-        section.fields.emplace_back(name, fieldText(FindProperty(map, name)));
+void addFields(Section& section, PropertyMap& map, const std::vector<NitfField_t>& fields) {
+    for (const NitfField_t& field : fields)
+        section.fields.emplace_back(field.name, fieldText(FindProperty(map, field.name)));
 }
 
 // The fields of a TRE the library parses, as its metadata entries.
@@ -130,7 +130,8 @@ Section describeHeader(CNitfFileHeader* header, FILE* fp) {
         {"NUMRES", "LRESH", "LRE", 4, 7, &CNitfFileHeader::getReservedExtensionHeaderDataPair},
     };
     Section section;
-    for (const char* name : header->getFieldNames()) {
+    for (const NitfField_t& field : header->getFields()) {
+        const char* name = field.name;
         section.fields.emplace_back(name, fieldText(FindProperty(header->getProperties(), name)));
         for (const Table& table : tables) {
             if (std::strcmp(name, table.count) != 0)
@@ -150,7 +151,7 @@ Section describeHeader(CNitfFileHeader* header, FILE* fp) {
 
 Section describeImage(CNitfImageSubheader* subheader, FILE* fp) {
     Section section;
-    addFields(section, subheader->getProperties(), subheader->getFieldNames());
+    addFields(section, subheader->getProperties(), subheader->getFields());
     addTres(section, subheader->getTaggedRecords(), fp);
 
     CNitfImagePropertiesIF geometry;
@@ -192,7 +193,7 @@ Section describeImage(CNitfImageSubheader* subheader, FILE* fp) {
 
 Section describeSegment(CNitfSegmentSource& segment, FILE* fp) {
     Section section;
-    addFields(section, segment.getProperties(), segment.getFieldNames());
+    addFields(section, segment.getProperties(), segment.getFields());
     addTres(section, segment.getTaggedRecords(), fp);
     section.summary.push_back(
         format("data: %lld bytes at offset %lld", segment.getDataLength(), segment.getDataOffset()));

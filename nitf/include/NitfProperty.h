@@ -59,6 +59,10 @@ public:
     // Raw bytes (eChars) copied from `bytes`.
     void setChars(const char* bytes, int length);
     void setInt4(int value);
+    void setUint1(int value);
+    void setUint2(int value);
+    void setFloat(float value);
+    void setDouble(double value);
 
     eDataType getDataType() const { return m_type; }
     // The owned buffer of an eString or eChars value (null for other kinds); getLength() tells its size.

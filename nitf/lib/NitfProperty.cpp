@@ -184,6 +184,31 @@ void CNitfProperty::setInt4(int value) {
     m_type = eInt4;
 }
 
+void CNitfProperty::setUint1(int value) {
+    release();
+    m_value.integer = value & 0xFF;
+    m_type = eUint1;
+}
+
+void CNitfProperty::setUint2(int value) {
+    release();
+    m_value.integer = value & 0xFFFF;
+    m_type = eUint2;
+}
+
+void CNitfProperty::setFloat(float value) {
+    release();
+    m_value.d = 0;
+    m_value.f = value;
+    m_type = eFloat;
+}
+
+void CNitfProperty::setDouble(double value) {
+    release();
+    m_value.d = value;
+    m_type = eDouble;
+}
+
 // ---- conversions
 // ----------------------------------------------------------------------------------------------
 
