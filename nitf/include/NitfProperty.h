@@ -32,6 +32,10 @@ public:
     CNitfProperty& operator=(const CNitfProperty& other);
     CNitfProperty(const CNitfProperty& other);
 
+    // Values come from pooled storage: a file's headers hold thousands of them.
+    static void* operator new(size_t size);
+    static void operator delete(void* object);
+
     // Readers: each releases the old value first. Binary values are big-endian in the file.
     void readString(FILE* fp, int length);
     void readChars(FILE* fp, int length);
@@ -99,7 +103,8 @@ public:
 private:
     void baseConstruct();
     void release();
-    char* allocateBuffer(int length, FILE* fp);
+    // A new buffer of `length` bytes read from the stream (zeros where the file ends) and a NUL.
+    static char* allocateBuffer(int length, FILE* fp);
 
     union Value {
         char* text;

@@ -214,7 +214,7 @@ struct Scratch {
 class ScratchLease {
 public:
     ScratchLease() {
-        thread_local Scratch shared;
+        __attribute__((tls_model("initial-exec"))) thread_local Scratch shared;
         if (shared.busy) {
             m_own.reset(new Scratch);
             m_scratch = m_own.get();
@@ -256,14 +256,15 @@ public:
 class FileInput : public Port {
 public:
     FileInput(FILE* fp, __int64 limit, size_t firstRead, std::vector<char>& buffer)
-        : m_fp(fp), m_start(DKFTell(fp)), m_limit(limit), m_firstRead(firstRead), m_buffer(buffer) {
+        : m_fp(fp), m_start(DKFTell(fp)), m_streamAt(m_start), m_limit(limit), m_firstRead(firstRead),
+          m_buffer(buffer) {
         m_buffer.clear();
         if (m_start < 0)
             m_limit = 0;
     }
 
     size_t take(__int64 width, const Entry&, const char** bytes) override {
-        size_t n = static_cast<size_t>(std::max<__int64>(0, std::min(width, readable())));
+        size_t n = static_cast<size_t>(readable(width));
         if (m_position + n > m_buffer.size())
             load(m_position + n);
         n = std::min(n, m_buffer.size() - m_position);
@@ -288,8 +289,7 @@ public:
     __int64 remaining() const override {
         if (!m_ended && m_fileRemaining < 0) {
             // Asked only for large counts and widths: sizing the file costs a system call.
-            __int64 here = DKFTell(m_fp);
-            m_fileRemaining = CDataStream::remaining(m_fp) + (here - m_start);
+            m_fileRemaining = CDataStream::remaining(m_fp) + (m_streamAt - m_start);
         }
         __int64 left = m_ended ? static_cast<__int64>(m_buffer.size()) : m_fileRemaining;
         if (m_limit >= 0)
@@ -299,18 +299,21 @@ public:
 
     // Leaves the stream just after the bytes passed.
     void finish() {
-        if (m_start + static_cast<__int64>(m_buffer.size()) != position())
+        if (m_streamAt != position())
             DKFSeek64(m_fp, position(), SEEK_SET);
     }
 
 private:
-    // Bytes that may still be asked for without sizing the file.
-    __int64 readable() const {
+    // How many of `width` bytes can be read: the file is sized only for widths beyond what a header field
+    // takes, before a buffer that large is allocated.
+    __int64 readable(__int64 width) const {
         static const __int64 kUnsized = 1 << 20;
-        __int64 left = m_ended ? static_cast<__int64>(m_buffer.size()) - consumed() : kUnsized;
-        if (m_limit >= 0)
-            left = std::min(left, m_limit - consumed());
-        return left >= kUnsized ? remaining() : left;
+        __int64 left = m_limit >= 0 ? m_limit - consumed() : width;
+        if (m_ended)
+            left = std::min(left, static_cast<__int64>(m_buffer.size()) - consumed());
+        else if (width > kUnsized)
+            left = std::min(left, remaining());
+        return std::max<__int64>(0, std::min(width, left));
     }
 
     // Reads on until the buffer holds `upTo` bytes (more on the first read).
@@ -321,17 +324,19 @@ private:
             wanted = std::min(wanted, static_cast<size_t>(m_limit));
         if (wanted <= loaded || m_ended)
             return;
-        if (m_start + static_cast<__int64>(loaded) != DKFTell(m_fp))
+        if (m_start + static_cast<__int64>(loaded) != m_streamAt)
             DKFSeek64(m_fp, m_start + static_cast<__int64>(loaded), SEEK_SET);
         m_buffer.resize(wanted);
         size_t got = DKFRead(m_buffer.data() + loaded, 1, wanted - loaded, m_fp);
         m_buffer.resize(loaded + got);
+        m_streamAt = m_start + static_cast<__int64>(loaded + got);
         if (loaded + got < wanted) // the file ends here
             m_ended = true;
     }
 
     FILE* m_fp;
     __int64 m_start;
+    __int64 m_streamAt; // where the stream stands
     __int64 m_limit;
     size_t m_firstRead;
     std::vector<char>& m_buffer; // the bytes from the start, as far as read
@@ -603,6 +608,8 @@ public:
           m_externalCount(externalCount), m_spans(scratch.spans), m_levels(scratch.levels),
           m_scratch(scratch.bytes) {
         m_spans.assign(static_cast<size_t>(layout.spanCount()), Span());
+        if (report.fields)
+            report.fields->reserve(report.fields->size() + m_nodes.size());
         m_levels.assign(static_cast<size_t>(layout.maxDepth() + 1), Level());
     }
 
