@@ -71,6 +71,11 @@ public:
     eDataType getDataType() const { return m_type; }
     // The owned buffer of an eString or eChars value (null for other kinds); getLength() tells its size.
     const char* getBytes() const { return m_type == eString || m_type == eChars ? m_value.text : nullptr; }
+    // The bytes an eString or eChars value holds as it was set or read, NULs included (getLength() of an
+    // eString stops at its first NUL); 0 for other kinds.
+    size_t getStoredLength() const {
+        return m_type == eString || m_type == eChars ? static_cast<size_t>(m_count) : 0;
+    }
     float getFloat() const { return m_value.f; }
     double getDouble() const { return m_value.d; }
 

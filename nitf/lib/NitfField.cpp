@@ -19,10 +19,8 @@ static std::string hexDigits(const char* bytes, size_t length) {
 }
 
 // The bytes a value holds as read: a field kept as its bytes holds exactly its width, NULs included.
-static size_t heldLength(const NitfField_t& field, CNitfProperty* value) {
-    if (value->getDataType() == CNitfProperty::eChars)
-        return static_cast<size_t>(value->getLength());
-    return field.width > 0 ? static_cast<size_t>(field.width) : std::strlen(value->getBytes());
+static size_t heldLength(const NitfField_t&, CNitfProperty* value) {
+    return value->getStoredLength();
 }
 
 bool nitfFieldNumber(const NitfField_t& field, CNitfProperty* value, double* number, long long* integer,

@@ -81,6 +81,7 @@ void CNitfProperty::readString(FILE* fp, int length) {
     char* text = allocateBuffer(length, fp);
     release();
     m_value.text = text;
+    m_count = length > 0 ? length : 0;
     m_type = eString;
 }
 
@@ -175,9 +176,11 @@ static char* copyText(const char* text, size_t length) {
 }
 
 void CNitfProperty::setString(const char* text) {
-    char* copy = copyText(text ? text : "", text ? std::strlen(text) : 0);
+    size_t length = text ? std::strlen(text) : 0;
+    char* copy = copyText(text ? text : "", length);
     release();
     m_value.text = copy;
+    m_count = length;
     m_type = eString;
 }
 
@@ -187,6 +190,7 @@ void CNitfProperty::setString(const char* text, int length) {
     char* copy = copyText(text, static_cast<size_t>(length));
     release();
     m_value.text = copy;
+    m_count = static_cast<unsigned __int64>(length);
     m_type = eString;
 }
 

@@ -534,11 +534,8 @@ void bytesOf(const Entry& field, const char* key, CNitfProperty& value, size_t w
     const bool typed = (field.flags & record::kTyped) != 0;
     const CNitfProperty::eDataType type = value.getDataType();
     const char* stored = value.getBytes();
-    const size_t storedLength = type == CNitfProperty::eChars ? static_cast<size_t>(value.getLength())
-                                : stored                      ? std::strlen(stored)
-                                                              : 0;
-    // Fields kept as their bytes hold exactly their width, NULs included.
-    const size_t rawLength = type == CNitfProperty::eString && !typed ? width : storedLength;
+    // Text read from a file holds exactly its field's bytes, NULs included.
+    const size_t storedLength = value.getStoredLength();
 
     if (form == eFieldText) {
         if (type == CNitfProperty::eString) {
@@ -568,14 +565,14 @@ void bytesOf(const Entry& field, const char* key, CNitfProperty& value, size_t w
                     out[i] = static_cast<char>(byte);
             }
         } else if (stored) {
-            fixedBytes(stored, std::min(rawLength, storedLength + 1), width, '\0', out);
+            fixedBytes(stored, storedLength, width, '\0', out);
         } else {
             out.assign(width, '\0');
         }
         return;
     }
     if (type == CNitfProperty::eString && !typed) {
-        fixedBytes(stored, rawLength, width, '\0', out);
+        fixedBytes(stored, storedLength, width, '\0', out);
         return;
     }
     double real = 0;
