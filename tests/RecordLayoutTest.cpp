@@ -96,9 +96,10 @@ TEST(RecordLayout, WhatIsWrittenReadsBackAndMeasuresAsWritten) {
     EXPECT_EQ(read.text("CODE12"), "M ");
     EXPECT_EQ(FindProperty(read.map, "COLOUR")->getDataType(), CNitfProperty::eChars);
     EXPECT_EQ(FindProperty(read.map, "COUNT")->getAsInt(), 0x0102);
-    ASSERT_EQ(places.size(), 1u);
+    ASSERT_EQ(places.size(), 2u); // the table not kept, and the hole
     EXPECT_EQ(places[0].index, 3);
     EXPECT_EQ(places[0].width, 4);
+    EXPECT_STREQ(places[1].entry->name, "CORNER");
     EXPECT_STREQ(fields.front().name, "NAME");
     EXPECT_STREQ(fields.back().name, "TAIL");
     EXPECT_EQ(fields.back().offset, static_cast<long long>(bytes.size()) - 2);

@@ -33,8 +33,6 @@ public:
     std::list<CNitfTag*>& getOverflowTags() { return m_overflowTags; }
 
 private:
-    // Reads one part of the sub-header, appending its fields to the others.
-    void readPart(FILE* fp, const CRecordLayout& layout);
     void readStreamingHeader(FILE* fp);
     void readOverflowTags(CNitfFile* file, FILE* fp, CNitfImageSource* image, CNitfSymbolSource* graphic);
 

@@ -51,7 +51,7 @@ public:
     void setPropertiesModified() { m_propertiesModified = true; }
     bool getPropertiesModified() const { return m_propertiesModified; }
     // The fields read, in file order.
-    const std::vector<NitfField_t>& getFields() const { return m_fields; }
+    const std::vector<NitfField_t>& getFields() const;
 
     // The integer value of "LALVL" (an empty field is created when absent, so this is 0 for files read).
     int getImageAttachment();
@@ -104,8 +104,12 @@ protected:
     std::list<CNitfTag*> m_taggedRecords;
     PropertyMap m_properties;
     bool m_propertiesModified;
-    std::vector<NitfField_t> m_fields;
     std::unique_ptr<CKeyStore> m_keys; // the keys of the band fields
+    // Where the sub-header was read: its fields are listed from there when first asked for.
+    const CRecordLayout* m_readLayout = nullptr;
+    __int64 m_readOffset = 0;
+    mutable std::vector<NitfField_t> m_fields;
+    mutable bool m_fieldsListed = false;
 
 private:
     // The values that writing computes rather than takes from the map: IREP, NICOM, IFCn, IMFLTn, the look-up

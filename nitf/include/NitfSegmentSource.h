@@ -4,6 +4,7 @@
 
 #include <cstdio>
 #include <list>
+#include <utility>
 #include <vector>
 
 #include "NitfField.h"
@@ -14,6 +15,9 @@
 
 class CNitfFile;
 class CRecordLayout;
+namespace record {
+struct Report;
+}
 
 class CNitfSegmentSource {
 public:
@@ -28,7 +32,7 @@ public:
     PropertyMap& getProperties() { return m_properties; }
     std::list<CNitfTag*>& getTaggedRecords() { return m_taggedRecords; }
     // The fields read, in file order.
-    const std::vector<NitfField_t>& getFields() const { return m_fields; }
+    const std::vector<NitfField_t>& getFields() const;
     // The text of a field with trailing blanks removed, or "" when absent.
     std::string getField(const char* name);
 
@@ -49,6 +53,8 @@ protected:
     // given) into this segment's list with `source`.
     void readFields(FILE* fp, const CRecordLayout& layout, const char* area = nullptr,
                     CNitfTag::eTagSource_t source = CNitfTag::eTagSourceUnknown);
+    // Reads one part of the sub-header at the stream's position (the parts follow each other).
+    void readPart(FILE* fp, const CRecordLayout& layout, const record::Report& report);
     void clearContents();
 
     __int64 m_subheaderOffset;
@@ -57,5 +63,8 @@ protected:
     int m_index;
     PropertyMap m_properties;
     std::list<CNitfTag*> m_taggedRecords;
-    std::vector<NitfField_t> m_fields;
+    // Where the parts of the sub-header were read: the fields are listed from there when first asked for.
+    std::vector<std::pair<const CRecordLayout*, __int64>> m_parts;
+    mutable std::vector<NitfField_t> m_fields;
+    mutable bool m_fieldsListed = false;
 };

@@ -79,13 +79,6 @@ static const CRecordLayout& headLayout(eNitfVersion_t version) {
     }
 }
 
-void CNitfDataExtensionSource::readPart(FILE* fp, const CRecordLayout& layout) {
-    record::Report report;
-    report.fields = &m_fields;
-    CKeyStore keys;
-    layout.read(fp, m_properties, keys, report);
-}
-
 void CNitfDataExtensionSource::constructor() {
     m_streamingHeaderLength = 0;
     m_streamingHeader = nullptr;
@@ -109,7 +102,7 @@ void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FIL
     static const CRecordLayout userFields(kUserFields);
     static const CRecordLayout cloudShape(kCloudShape);
 
-    readPart(fp, headLayout(version));
+    readPart(fp, headLayout(version), {});
     if (version == eNitfVersion20) {
         m_overflow = fieldEquals(m_properties, "DESTAG", "Registered Extensions", 25) ||
                      fieldEquals(m_properties, "DESTAG", "Controlled Extensions", 25);
@@ -120,8 +113,8 @@ void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FIL
     }
     // DESITEM names the overflowed segment; the TREs are attached by area, not by item.
     if (m_overflow)
-        readPart(fp, overflow);
-    readPart(fp, m_cloudShape ? cloudShape : userFields);
+        readPart(fp, overflow, {});
+    readPart(fp, m_cloudShape ? cloudShape : userFields, {});
 
     if (m_streaming) {
         readStreamingHeader(fp);
@@ -134,7 +127,7 @@ void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FIL
 void CNitfDataExtensionSource::readStreamingHeader(FILE* fp) {
     static const CRecordLayout lead(kStreamingLead);
     static const CRecordLayout trail(kStreamingTrail);
-    readPart(fp, lead);
+    readPart(fp, lead, {});
     CNitfProperty* declared = FindProperty(m_properties, "SFH_L1");
     if (!declared)
         return; // the file ends before the streaming header
@@ -145,7 +138,7 @@ void CNitfDataExtensionSource::readStreamingHeader(FILE* fp) {
     m_streamingHeaderLength = length;
     m_streamingHeader = static_cast<char*>(HMalloc(length > 0 ? length : 1));
     CDataStream::readZeroFilled(fp, m_streamingHeader, static_cast<size_t>(length));
-    readPart(fp, trail);
+    readPart(fp, trail, {});
     // Leave the stream at the first byte of the replacement header.
     DKFSeek64(fp, -(11 + static_cast<__int64>(length)), SEEK_CUR);
 }

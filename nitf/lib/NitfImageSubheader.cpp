@@ -59,12 +59,8 @@ CNitfImageSubheader& CNitfImageSubheader::operator=(const CNitfImageSubheader& o
     for (const auto& entry : other.m_properties)
         SetProperty(m_properties, m_keys->add(entry.first, std::strlen(entry.first)),
                     cloneProperty(entry.second));
-    for (NitfField_t field : other.m_fields) {
-        auto found = m_properties.find(const_cast<char*>(field.name));
-        if (found != m_properties.end())
-            field.name = found->first;
-        m_fields.push_back(field);
-    }
+    m_readLayout = other.m_readLayout;
+    m_readOffset = other.m_readOffset;
     m_propertiesModified = other.m_propertiesModified;
     return *this;
 }
@@ -83,7 +79,9 @@ void CNitfImageSubheader::clearContents() {
     CNitfTag::destroyList(m_taggedRecords);
     DestroyPropertyMap(m_properties);
     m_keys->clear();
+    m_readLayout = nullptr;
     m_fields.clear();
+    m_fieldsListed = false;
     m_georef = CNitfGeorefInfo();
 }
 
@@ -192,25 +190,35 @@ static int bandValue(PropertyMap& map, const char* name, int band, int count) {
     return value && value->getDataType() != CNitfProperty::eNone ? value->getAsInt() : 0;
 }
 
-static const NitfField_t* findField(const std::vector<NitfField_t>& fields, const char* name) {
-    for (const NitfField_t& field : fields) {
-        if (std::strcmp(field.name, name) == 0)
-            return &field;
+static const record::Placed* findPlace(const std::vector<record::Placed>& places, const char* name) {
+    for (const record::Placed& place : places) {
+        if (std::strcmp(place.entry->name, name) == 0)
+            return &place;
     }
     return nullptr;
+}
+
+const std::vector<NitfField_t>& CNitfImageSubheader::getFields() const {
+    if (!m_fieldsListed && m_readLayout) {
+        m_fields.clear();
+        m_readLayout->listFields(m_properties, m_readOffset, m_fields);
+    }
+    m_fieldsListed = true;
+    return m_fields;
 }
 
 void CNitfImageSubheader::readWith(FILE* fp, eNitfVersion_t version) {
     clearContents();
     std::vector<record::Placed> places;
     record::Report report;
-    report.fields = &m_fields;
     report.places = &places;
-    readLayout(version).read(fp, m_properties, *m_keys, report);
+    m_readLayout = &readLayout(version);
+    m_readOffset = DKFTell(fp);
+    m_readLayout->read(fp, m_properties, *m_keys, report);
 
     CNitfProperty* icords = FindProperty(m_properties, "ICORDS");
     m_georef.setCoordinateType(icords ? icords->getAsString()[0] : '\0', version);
-    const NitfField_t* corners = findField(m_fields, "IGEOLO1");
+    const record::Placed* corners = findPlace(places, "IGEOLO1");
     if (m_georef.hasCoordinates() && corners)
         m_georef.setIgeoloOffset(corners->offset);
 
@@ -296,9 +304,7 @@ __int64 CNitfImageSubheader::writeWithLayout(FILE* fp) {
     PropertyMap values;
     CKeyStore keys;
     std::vector<record::Placed> places;
-    std::vector<NitfField_t> fields;
     record::Report report;
-    report.fields = &fields;
     report.places = &places;
     __int64 written = 0;
     try {
@@ -311,7 +317,7 @@ __int64 CNitfImageSubheader::writeWithLayout(FILE* fp) {
     DestroyPropertyMap(values);
 
     // The corners, the look-up table and the TRE data are written at their places by their owners.
-    const NitfField_t* corners = findField(fields, "IGEOLO1");
+    const record::Placed* corners = findPlace(places, "IGEOLO1");
     if (corners)
         m_georef.setIgeoloOffset(corners->offset);
     CNitfLutSource* lut = getLutSource(0);

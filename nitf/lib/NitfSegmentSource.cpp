@@ -20,7 +20,9 @@ CNitfSegmentSource::~CNitfSegmentSource() {
 void CNitfSegmentSource::clearContents() {
     DestroyPropertyMap(m_properties);
     CNitfTag::destroyList(m_taggedRecords);
+    m_parts.clear();
     m_fields.clear();
+    m_fieldsListed = false;
 }
 
 void CNitfSegmentSource::prepare(const CNitfHeaderDataPair* pair) {
@@ -50,13 +52,28 @@ void CNitfSegmentSource::readFields(FILE* fp, const CRecordLayout& layout, const
                                     CNitfTag::eTagSource_t source) {
     std::vector<record::Placed> places;
     record::Report report;
-    report.fields = &m_fields;
     report.places = &places;
-    CKeyStore keys;
-    layout.read(fp, m_properties, keys, report);
+    readPart(fp, layout, report);
     // The overflow number is not kept: an overflow is resolved when its data extension segment is read.
     if (area)
         readTagAreas(places, {area}, source, m_taggedRecords);
+}
+
+void CNitfSegmentSource::readPart(FILE* fp, const CRecordLayout& layout, const record::Report& report) {
+    // Segment layouts have no repeated fields: no keys are built.
+    CKeyStore keys;
+    m_parts.emplace_back(&layout, DKFTell(fp));
+    layout.read(fp, m_properties, keys, report);
+}
+
+const std::vector<NitfField_t>& CNitfSegmentSource::getFields() const {
+    if (!m_fieldsListed) {
+        m_fields.clear();
+        for (const auto& part : m_parts)
+            part.first->listFields(m_properties, part.second, m_fields);
+        m_fieldsListed = true;
+    }
+    return m_fields;
 }
 
 char* CNitfSegmentSource::getNewData(CNitfFile* file) {

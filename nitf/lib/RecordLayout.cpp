@@ -370,17 +370,19 @@ private:
 
 class Counter : public Port {
 public:
+    explicit Counter(__int64 base = 0) : m_base(base) {}
     size_t take(__int64, const Entry&, const char**) override { return 0; }
     void put(const char*, size_t width, const Entry&) override { m_count += static_cast<__int64>(width); }
     __int64 skip(__int64 width) override {
         m_count += width;
         return width;
     }
-    __int64 position() const override { return m_count; }
+    __int64 position() const override { return m_base + m_count; }
     __int64 consumed() const override { return m_count; }
     __int64 remaining() const override { return INT64_MAX / 4; }
 
 private:
+    __int64 m_base;
     __int64 m_count = 0;
 };
 
@@ -622,6 +624,13 @@ public:
         range(0, static_cast<int>(m_nodes.size()));
     }
 
+    // Walks as writing does, reporting only the fields the map holds.
+    void list(const PropertyMap& map) {
+        m_listing = true;
+        m_writeMap = &map;
+        range(0, static_cast<int>(m_nodes.size()));
+    }
+
 private:
     bool reading() const { return m_readMap != nullptr; }
 
@@ -673,6 +682,9 @@ private:
             readField(node, width, offset);
         else
             writeField(node, width, offset);
+        // Holes are placed too: their owners fill them in.
+        if ((entry.flags & record::kHole) && m_report.places)
+            m_report.places->push_back({&entry, offset, width, m_levels[node.depth].index, std::string()});
     }
 
     void readField(const Node& node, __int64 width, __int64 offset) {
@@ -693,7 +705,8 @@ private:
     }
 
     void writeField(const Node& node, __int64 width, __int64 offset) {
-        if (!writeValue(node, width)) {
+        const char* key = writeValue(node, width);
+        if (!key) {
             if (node.entry->flags & record::kHole) {
                 m_port.skip(width);
             } else {
@@ -703,26 +716,37 @@ private:
                 m_port.put(m_scratch.data(), m_scratch.size(), *node.entry);
             }
         }
-        if (m_report.fields)
-            m_report.fields->push_back({node.entry->name, static_cast<eNitfFieldForm_t>(node.entry->form),
+        if (m_report.fields && (key || !m_listing))
+            m_report.fields->push_back({key ? key : node.entry->name,
+                                        static_cast<eNitfFieldForm_t>(node.entry->form),
                                         static_cast<int>(width), offset});
     }
 
-    // Writes the field's value when it has one; false when it has none.
-    bool writeValue(const Node& node, __int64 width) {
+    // Writes the field's value when it has one and returns its key (the map's own, when the map holds it);
+    // null when it has none.
+    const char* writeValue(const Node& node, __int64 width) {
         char built[kLongestName + kDeepestNesting * 24 + 1];
         const char* key = keyOf(node, built, nullptr);
-        CNitfProperty* value = m_overrides ? FindProperty(*m_overrides, key) : nullptr;
-        if (!value)
-            value = FindProperty(*m_writeMap, key);
+        CNitfProperty* value = nullptr;
+        if (m_overrides)
+            value = FindProperty(*m_overrides, key);
+        if (value) {
+            key = node.entry->name;
+        } else {
+            auto found = m_writeMap->find(const_cast<char*>(key));
+            if (found != m_writeMap->end()) {
+                value = found->second;
+                key = found->first;
+            }
+        }
         if (!value || value->getDataType() == CNitfProperty::eNone)
-            return false;
+            return nullptr;
         if (static_cast<Width>(node.entry->kind) == Width::RestOfData && m_dataLength < 0)
             width = static_cast<__int64>(value->getLength());
         bytesOf(*node.entry, key, *value, static_cast<size_t>(std::max<__int64>(0, width)), m_scratch);
         remember(node, m_scratch.data(), m_scratch.size());
         m_port.put(m_scratch.data(), m_scratch.size(), *node.entry);
-        return true;
+        return key;
     }
 
     void repeat(int index) {
@@ -983,6 +1007,7 @@ private:
     const PropertyMap* m_overrides = nullptr;
     std::string& m_scratch;
     bool m_stopped = false;
+    bool m_listing = false;
 };
 
 } // namespace
@@ -1013,6 +1038,15 @@ __int64 CRecordLayout::length(const PropertyMap& map, const PropertyMap* overrid
     Counter counter;
     Walk(*this, counter, *scratch, {}, -1, 0).write(map, overrides);
     return counter.consumed();
+}
+
+void CRecordLayout::listFields(const PropertyMap& map, __int64 offset,
+                               std::vector<NitfField_t>& fields) const {
+    ScratchLease scratch;
+    Counter counter(offset);
+    record::Report report;
+    report.fields = &fields;
+    Walk(*this, counter, *scratch, report, -1, 0).list(map);
 }
 
 void CRecordLayout::deserialize(nitf::CSerializer& in, PropertyMap& map, CKeyStore& keys,

@@ -250,7 +250,7 @@ struct Placed {
 // What a walk reports besides the map. Every member is optional.
 struct Report {
     std::vector<NitfField_t>* fields = nullptr; // kept fields, in file order
-    std::vector<Placed>* places = nullptr;      // fields not kept, in file order
+    std::vector<Placed>* places = nullptr;      // fields not kept, and holes, in file order
 };
 
 } // namespace record
@@ -283,6 +283,10 @@ public:
 
     // The bytes `write` produces for the same values.
     __int64 length(const PropertyMap& map, const PropertyMap* overrides = nullptr) const;
+
+    // Appends the fields of `map` that this layout holds, in file order, as read from `offset`: listing them
+    // after reading costs nothing while nobody asks.
+    void listFields(const PropertyMap& map, __int64 offset, std::vector<NitfField_t>& fields) const;
 
     // The same walks over the binary serializer family (binary forms through its typed operators, text and
     // bytes as arrays): reading fills `map`, writing takes its values from it.
