@@ -13,17 +13,34 @@
 #include "NitfImageSource.h"
 #include "NitfSymbolSource.h"
 
-// Identifiers are compared in their stored, blank-padded form.
-static std::string padded(const char* text, size_t width) {
-    std::string value(text);
-    value.resize(width, ' ');
-    return value;
+// Identifiers are compared in their stored form, blank-padded to 25 characters, ignoring case.
+static bool identifierIs(const char* bytes, size_t length, const char* word) {
+    char padded[26];
+    std::snprintf(padded, sizeof padded, "%-25s", word);
+    return length == 25 && _strnicmp(bytes, padded, 25) == 0 && !std::memchr(bytes, 0, 25);
 }
 
-static bool fieldEquals(PropertyMap& map, const char* name, const char* value, size_t width) {
+static bool isOverflow20(const char* tag, size_t length) {
+    return identifierIs(tag, length, "Registered Extensions") || identifierIs(tag, length, "Controlled Extensions");
+}
+static bool isOverflow21(const char* id, size_t length) {
+    return identifierIs(id, length, "TRE_OVERFLOW");
+}
+static bool isCloudShape(const char* id, size_t length) {
+    return identifierIs(id, length, "CSSHPA DES");
+}
+static bool isNotCloudShape(const char* id, size_t length) {
+    return !isCloudShape(id, length);
+}
+static bool isStreaming(const char* id, size_t length) {
+    return identifierIs(id, length, "STREAMING_FILE_HEADER");
+}
+
+// Whether the identifier field read holds that kind.
+static bool fieldIs(PropertyMap& map, const char* name, bool (*kind)(const char*, size_t)) {
     CNitfProperty* field = FindProperty(map, name);
     return field && field->getDataType() == CNitfProperty::eString &&
-           _stricmp(field->getAsString(), padded(value, width).c_str()) == 0;
+           kind(field->getBytes(), field->getStoredLength());
 }
 
 using namespace record;
@@ -36,35 +53,49 @@ static Part part(const std::vector<Entry>& entries) {
 static const Entry kHead20[] = {Text("DE", 2), Text("DESTAG", 25), Text("DESVER", 2)};
 static const Entry kHead21[] = {Text("DE", 2), Text("DESID", 25), Text("DESVER", 2)};
 static const Entry kOsdeSecurity[] = {Text("DESSEC", 167)};
-static const Entry kOverflow[] = {Text("DESOFLW", 6), Text("DESITEM", 3)};
-static const Entry kUserFields[] = {
+// The kinds follow the identifier: overflow segments name the area and item they overflowed from, cloud
+// shapes carry their shape fields where other segments carry user-defined fields.
+static const Entry kBody20[] = {
+    IfCall("DESTAG", isOverflow20),
+        Text("DESOFLW", 6), Text("DESITEM", 3),
+    End(),
     Text("DESSHL", 4),
     IfNotZero("DESSHL"),
         TextSizedBy("DESSHF", "DESSHL"),
     End(),
 };
-static const Entry kCloudShape[] = {
-    Text("DESSHL", 4),
-    Text("SHAPE_USE", 25),
-    Text("SHAPE_CLASS", 10),
-    IfTextIgnoringCase("SHAPE_USE", "CLOUD_SHAPES             "),
-        Text("CC_SOURCE", 18),
+static const Entry kBody21[] = {
+    IfCall("DESID", isOverflow21),
+        Text("DESOFLW", 6), Text("DESITEM", 3),
     End(),
-    Text("SHAPE1_NAME", 3), Text("SHAPE1_START", 6),
-    Text("SHAPE2_NAME", 3), Text("SHAPE2_START", 6),
-    Text("SHAPE3_NAME", 3), Text("SHAPE3_START", 6),
+    Text("DESSHL", 4),
+    IfCall("DESID", isCloudShape),
+        Text("SHAPE_USE", 25),
+        Text("SHAPE_CLASS", 10),
+        IfTextIgnoringCase("SHAPE_USE", "CLOUD_SHAPES             "),
+            Text("CC_SOURCE", 18),
+        End(),
+        Text("SHAPE1_NAME", 3), Text("SHAPE1_START", 6),
+        Text("SHAPE2_NAME", 3), Text("SHAPE2_START", 6),
+        Text("SHAPE3_NAME", 3), Text("SHAPE3_START", 6),
+    End(),
+    IfCall("DESID", isNotCloudShape),
+        IfNotZero("DESSHL"),
+            TextSizedBy("DESSHF", "DESSHL"),
+        End(),
+    End(),
 };
 static const Entry kStreamingLead[] = {Text("SFH_L1", 7), Unsigned("SFH_DELIM1", 4, kTyped)};
 static const Entry kStreamingTrail[] = {Unsigned("SFH_DELIM2", 4, kTyped), Text("SFH_L2", 7)};
 // clang-format on
 
-// DE, DESID (DESTAG in NITF 2.0), DESVER and the security group of the version.
-static const CRecordLayout& headLayout(eNitfVersion_t version) {
+// DE, DESID (DESTAG in NITF 2.0), DESVER, the security group of the version, and the fields of the kind.
+static const CRecordLayout& layoutOf(eNitfVersion_t version) {
     // The 2.0 control-and-handling field is kept as "DECTLH"; callers look it up by that name.
-    static const CRecordLayout nitf20({kHead20, part(securityFields20("DES", "DECTLH"))});
-    static const CRecordLayout nitf21({kHead21, part(securityFields21("DES"))});
-    static const CRecordLayout osde({kHead21, kOsdeSecurity});
-    static const CRecordLayout other(kHead21);
+    static const CRecordLayout nitf20({kHead20, part(securityFields20("DES", "DECTLH")), kBody20});
+    static const CRecordLayout nitf21({kHead21, part(securityFields21("DES")), kBody21});
+    static const CRecordLayout osde({kHead21, kOsdeSecurity, kBody21});
+    static const CRecordLayout other({kHead21, kBody21});
     switch (version) {
     case eNitfVersion20:
         return nitf20;
@@ -98,23 +129,15 @@ void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FIL
     constructor();
     fp = positionAtSubheader(file, fp);
 
-    static const CRecordLayout overflow(kOverflow);
-    static const CRecordLayout userFields(kUserFields);
-    static const CRecordLayout cloudShape(kCloudShape);
-
-    readPart(fp, headLayout(version), {});
+    readPart(fp, layoutOf(version), {});
     if (version == eNitfVersion20) {
-        m_overflow = fieldEquals(m_properties, "DESTAG", "Registered Extensions", 25) ||
-                     fieldEquals(m_properties, "DESTAG", "Controlled Extensions", 25);
+        m_overflow = fieldIs(m_properties, "DESTAG", isOverflow20);
     } else {
-        m_streaming = fieldEquals(m_properties, "DESID", "STREAMING_FILE_HEADER", 25);
-        m_overflow = fieldEquals(m_properties, "DESID", "TRE_OVERFLOW", 25);
-        m_cloudShape = fieldEquals(m_properties, "DESID", "CSSHPA DES", 25);
+        m_streaming = fieldIs(m_properties, "DESID", isStreaming);
+        m_overflow = fieldIs(m_properties, "DESID", isOverflow21);
+        m_cloudShape = fieldIs(m_properties, "DESID", ::isCloudShape);
     }
     // DESITEM names the overflowed segment; the TREs are attached by area, not by item.
-    if (m_overflow)
-        readPart(fp, overflow, {});
-    readPart(fp, m_cloudShape ? cloudShape : userFields, {});
 
     if (m_streaming) {
         readStreamingHeader(fp);
@@ -149,7 +172,12 @@ void CNitfDataExtensionSource::readOverflowTags(CNitfFile* file, FILE* fp, CNitf
     std::list<CNitfTag*>* target = header ? &header->getTaggedRecords() : nullptr;
     CNitfTag::eTagSource_t source = CNitfTag::eTagSourceUnknown;
 
-    auto area = [&](const char* name) { return fieldEquals(m_properties, "DESOFLW", name, 6); };
+    auto area = [&](const char* name) {
+        CNitfProperty* field = FindProperty(m_properties, "DESOFLW");
+        char padded[7];
+        std::snprintf(padded, sizeof padded, "%-6s", name);
+        return field && field->getDataType() == CNitfProperty::eString && _stricmp(field->getAsString(), padded) == 0;
+    };
     if (area("XHD") || area("UDHD")) {
         source = CNitfTag::eTagSourceFileHeaderDES;
     } else if (area("IXSHD") || area("UDID")) {
