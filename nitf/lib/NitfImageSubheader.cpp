@@ -212,8 +212,8 @@ void CNitfImageSubheader::readWith(FILE* fp, eNitfVersion_t version) {
     std::vector<record::Placed> places;
     record::Report report;
     report.places = &places;
+    report.start = &m_readOffset;
     m_readLayout = &readLayout(version);
-    m_readOffset = DKFTell(fp);
     m_readLayout->read(fp, m_properties, *m_keys, report);
 
     CNitfProperty* icords = FindProperty(m_properties, "ICORDS");

@@ -62,8 +62,10 @@ void CNitfSegmentSource::readFields(FILE* fp, const CRecordLayout& layout, const
 void CNitfSegmentSource::readPart(FILE* fp, const CRecordLayout& layout, const record::Report& report) {
     // Segment layouts have no repeated fields: no keys are built.
     CKeyStore keys;
-    m_parts.emplace_back(&layout, DKFTell(fp));
-    layout.read(fp, m_properties, keys, report);
+    m_parts.emplace_back(&layout, 0);
+    record::Report withStart = report;
+    withStart.start = &m_parts.back().second;
+    layout.read(fp, m_properties, keys, withStart);
 }
 
 const std::vector<NitfField_t>& CNitfSegmentSource::getFields() const {

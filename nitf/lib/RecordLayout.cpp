@@ -54,11 +54,20 @@ __int64 recordFieldValue(const char* bytes, size_t length, eNitfFieldForm_t form
     }
     if (form == eFieldFloat || form == eFieldDouble)
         return 0; // floating-point fields count nothing
-    char text[32];
-    size_t n = std::min(length, sizeof text - 1);
-    std::memcpy(text, bytes, n);
-    text[n] = '\0';
-    return std::max(-kLimit, std::min(kLimit, std::strtoll(text, nullptr, 10)));
+    // atoi's reading: leading blanks, a sign, then digits up to the first other character.
+    size_t i = 0;
+    while (i < length && (bytes[i] == ' ' || (bytes[i] >= '\t' && bytes[i] <= '\r')))
+        ++i;
+    bool negative = i < length && bytes[i] == '-';
+    if (i < length && (bytes[i] == '-' || bytes[i] == '+'))
+        ++i;
+    long long value = 0;
+    for (; i < length && bytes[i] >= '0' && bytes[i] <= '9'; ++i) {
+        value = value * 10 + (bytes[i] - '0');
+        if (value >= kLimit)
+            return negative ? -kLimit : kLimit;
+    }
+    return negative ? -value : value;
 }
 
 // ---- the checked layout
@@ -972,8 +981,10 @@ private:
         if (slot) {
             n = static_cast<size_t>(slot - name);
             std::memcpy(buffer, name, n);
-            n += std::sprintf(buffer + n, "%lld", m_levels[1].index);
-            n += std::sprintf(buffer + n, "%s", slot + 2);
+            n += putNumber(buffer + n, m_levels[1].index, 1);
+            size_t rest = std::strlen(slot + 2);
+            std::memcpy(buffer + n, slot + 2, rest);
+            n += rest;
         } else {
             n = std::strlen(name);
             std::memcpy(buffer, name, n);
@@ -982,9 +993,10 @@ private:
                 if (at.bandKeys) {
                     // Padded to the width of the count below 1000 bands, not padded at all from 1000 on.
                     int digits = at.count < 10 || at.count >= 1000 ? 1 : at.count < 100 ? 2 : 3;
-                    n += std::sprintf(buffer + n, "%0*lld", digits, at.index);
+                    n += putNumber(buffer + n, at.index, digits);
                 } else {
-                    n += std::sprintf(buffer + n, "_%lld", at.index);
+                    buffer[n++] = '_';
+                    n += putNumber(buffer + n, at.index, 1);
                 }
             }
         }
@@ -992,6 +1004,26 @@ private:
         if (length)
             *length = n;
         return buffer;
+    }
+
+    // Writes `value` in decimal, zero-padded to `digits`; returns the characters written.
+    static size_t putNumber(char* out, long long value, int digits) {
+        char reversed[24];
+        size_t n = 0;
+        bool negative = value < 0;
+        unsigned long long magnitude = negative ? 0ULL - static_cast<unsigned long long>(value) : value;
+        do {
+            reversed[n++] = static_cast<char>('0' + magnitude % 10);
+            magnitude /= 10;
+        } while (magnitude);
+        while (n < static_cast<size_t>(digits))
+            reversed[n++] = '0';
+        size_t length = 0;
+        if (negative)
+            out[length++] = '-';
+        while (n)
+            out[length++] = reversed[--n];
+        return length;
     }
 
     const std::vector<Node>& m_nodes;
@@ -1020,6 +1052,8 @@ __int64 CRecordLayout::read(FILE* fp, PropertyMap& map, CKeyStore& keys, const r
     ScratchLease scratch;
     FileInput input(fp, limit, static_cast<size_t>(std::min<long long>(m_minimalLength, 1 << 16)),
                     (*scratch).input);
+    if (report.start)
+        *report.start = input.position();
     Walk(*this, input, *scratch, report, dataLength, externalCount).read(map, keys);
     input.finish();
     return input.consumed();

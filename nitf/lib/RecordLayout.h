@@ -251,6 +251,7 @@ struct Placed {
 struct Report {
     std::vector<NitfField_t>* fields = nullptr; // kept fields, in file order
     std::vector<Placed>* places = nullptr;      // fields not kept, and holes, in file order
+    __int64* start = nullptr;                   // reading: where the record began
 };
 
 } // namespace record
