@@ -106,9 +106,8 @@ CRecordLayout::CRecordLayout(std::initializer_list<record::Part> parts) {
     for (int i = 0; i < count; ++i) {
         const Entry& entry = m_entries[i];
         checkEntry(entry, static_cast<int>(repeats.size()));
-        Node node = {
-            &entry, -1, -1, -1, static_cast<int>(repeats.size()), repeats.empty() ? -1 : repeats.back(),
-            0,      -1};
+        Node node = {&entry, -1, -1, -1, static_cast<int>(repeats.size()), repeats.empty() ? -1 : repeats.back(),
+                     0, -1, -1};
         if (entry.op == Op::End) {
             if (open.empty())
                 tableFault("End without a group", nullptr);
@@ -155,6 +154,27 @@ CRecordLayout::CRecordLayout(std::initializer_list<record::Part> parts) {
             node.minWidth = minimalWidth(i + 1, node.end);
     }
     m_minimalLength = minimalWidth(0, count);
+    rankKeys();
+}
+
+// Reading into an empty map, a field whose key's place among the layout's fixed keys is known goes in beside
+// its nearest neighbour already there, without searching the map.
+void CRecordLayout::rankKeys() {
+    std::vector<const char*> names;
+    for (const Node& node : m_nodes) {
+        if (node.entry->op == Op::Field && node.depth == 0 && !(node.entry->flags & record::kNotKept))
+            names.push_back(node.entry->name);
+    }
+    std::sort(names.begin(), names.end(), ltstr());
+    names.erase(std::unique(names.begin(), names.end(),
+                            [](const char* a, const char* b) { return std::strcmp(a, b) == 0; }),
+                names.end());
+    m_rankCount = static_cast<int>(names.size());
+    for (Node& node : m_nodes) {
+        if (node.entry->op == Op::Field && node.depth == 0 && !(node.entry->flags & record::kNotKept))
+            node.rank = static_cast<int>(std::lower_bound(names.begin(), names.end(), node.entry->name, ltstr()) -
+                                         names.begin());
+    }
 }
 
 void CRecordLayout::keepValue(int field) {
@@ -214,6 +234,8 @@ struct Level {
 struct Scratch {
     std::vector<Span> spans;
     std::vector<Level> levels;
+    std::vector<PropertyMap::iterator> byRank; // reading into an empty map: where each ranked key went
+    std::vector<uint64_t> ranked;              // which ranks are in
     std::vector<char> input;
     std::string bytes;
     bool busy = false;
@@ -614,6 +636,7 @@ public:
          __int64 dataLength, __int64 externalCount)
         : m_nodes(layout.nodes()), m_port(port), m_report(report), m_dataLength(dataLength),
           m_externalCount(externalCount), m_spans(scratch.spans), m_levels(scratch.levels),
+          m_byRank(scratch.byRank), m_ranked(scratch.ranked), m_rankCount(layout.rankCount()),
           m_scratch(scratch.bytes) {
         m_spans.assign(static_cast<size_t>(layout.spanCount()), Span());
         if (report.fields)
@@ -624,6 +647,11 @@ public:
     void read(PropertyMap& map, CKeyStore& keys) {
         m_readMap = &map;
         m_keys = &keys;
+        m_fresh = map.empty();
+        if (m_fresh) {
+            m_byRank.assign(static_cast<size_t>(m_rankCount), map.end());
+            m_ranked.assign(static_cast<size_t>(m_rankCount / 64 + 1), 0);
+        }
         range(0, static_cast<int>(m_nodes.size()));
     }
 
@@ -914,6 +942,8 @@ private:
             property->setString(bytes, static_cast<int>(length));
         }
 
+        if (m_fresh && node.rank >= 0)
+            return storeRanked(node, property);
         char built[kLongestName + kDeepestNesting * 24 + 1];
         size_t keyLength = 0;
         char* key = keyOf(node, built, &keyLength);
@@ -929,6 +959,34 @@ private:
             key = m_keys->add(built, keyLength);
         map.emplace_hint(place, key, property);
         return key;
+    }
+
+    // Inserts beside the next ranked key already in: right unless a key of a repeated field came between,
+    // which the map then finds itself.
+    const char* storeRanked(const Node& node, CNitfProperty* property) {
+        PropertyMap& map = *m_readMap;
+        const size_t rank = static_cast<size_t>(node.rank);
+        PropertyMap::iterator& place = m_byRank[rank];
+        if (place == map.end()) {
+            PropertyMap::iterator next = map.end();
+            for (size_t word = rank / 64; word < m_ranked.size(); ++word) {
+                uint64_t bits = m_ranked[word];
+                if (word == rank / 64)
+                    bits &= ~0ULL << (rank % 64);
+                if (bits) {
+                    next = m_byRank[word * 64 + static_cast<size_t>(__builtin_ctzll(bits))];
+                    break;
+                }
+            }
+            place = map.emplace_hint(next, const_cast<char*>(node.entry->name), property);
+            m_ranked[rank / 64] |= 1ULL << (rank % 64);
+            if (place->second == property)
+                return place->first;
+        }
+        // The key is in already: the new value replaces the old.
+        delete place->second;
+        place->second = property;
+        return place->first;
     }
 
     static void setTyped(CNitfProperty& property, eNitfFieldForm_t form, const char* bytes, size_t length) {
@@ -1033,6 +1091,10 @@ private:
     __int64 m_externalCount;
     std::vector<Span>& m_spans;
     std::vector<Level>& m_levels; // [depth]: the repetition a field at that depth belongs to
+    std::vector<PropertyMap::iterator>& m_byRank;
+    std::vector<uint64_t>& m_ranked;
+    int m_rankCount;
+    bool m_fresh = false;
     PropertyMap* m_readMap = nullptr;
     CKeyStore* m_keys = nullptr;
     const PropertyMap* m_writeMap = nullptr;

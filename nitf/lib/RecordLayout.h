@@ -304,22 +304,26 @@ public:
         int repeat;         // index of the innermost enclosing Repeat, or -1
         long long minWidth; // Repeat: bytes one repetition needs at the least
         int span;           // the slot that keeps this field's value for later entries, or -1
+        int rank;           // a kept field outside repeated groups: its key's place among those keys, or -1
     };
     const std::vector<Node>& nodes() const { return m_nodes; }
     int maxDepth() const { return m_maxDepth; }
     int spanCount() const { return m_spanCount; }
+    int rankCount() const { return m_rankCount; }
     // Bytes that every record of this layout takes at the least.
     long long minimalLength() const { return m_minimalLength; }
 
 private:
     int findField(int from, const char* name) const;
     void keepValue(int field);
+    void rankKeys();
     long long minimalWidth(int begin, int end) const;
 
     std::vector<record::Entry> m_entries;
     std::vector<Node> m_nodes;
     int m_maxDepth = 0;
     int m_spanCount = 0;
+    int m_rankCount = 0;
     long long m_minimalLength = 0;
 };
 
