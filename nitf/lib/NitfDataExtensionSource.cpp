@@ -15,9 +15,14 @@
 
 // Identifiers are compared in their stored form, blank-padded to 25 characters, ignoring case.
 static bool identifierIs(const char* bytes, size_t length, const char* word) {
-    char padded[26];
-    std::snprintf(padded, sizeof padded, "%-25s", word);
-    return length == 25 && _strnicmp(bytes, padded, 25) == 0 && !std::memchr(bytes, 0, 25);
+    size_t n = std::strlen(word);
+    if (length != 25 || _strnicmp(bytes, word, n) != 0)
+        return false;
+    for (size_t i = n; i < 25; ++i) {
+        if (bytes[i] != ' ')
+            return false;
+    }
+    return true;
 }
 
 static bool isOverflow20(const char* tag, size_t length) {
