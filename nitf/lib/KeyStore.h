@@ -18,6 +18,8 @@ public:
     void clear();
 
 private:
+    // The first keys go here: most owners have a handful and need no block at all.
+    char m_first[192];
     std::vector<std::unique_ptr<char[]>> m_blocks;
     size_t m_used = 0;
     size_t m_capacity = 0;

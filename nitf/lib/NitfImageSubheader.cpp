@@ -210,6 +210,7 @@ const std::vector<NitfField_t>& CNitfImageSubheader::getFields() const {
 void CNitfImageSubheader::readWith(FILE* fp, eNitfVersion_t version) {
     clearContents();
     std::vector<record::Placed> places;
+    places.reserve(8); // the TRE areas and their overflow numbers, comments, look-up tables
     record::Report report;
     report.places = &places;
     report.start = &m_readOffset;
