@@ -26,7 +26,8 @@ static bool identifierIs(const char* bytes, size_t length, const char* word) {
 }
 
 static bool isOverflow20(const char* tag, size_t length) {
-    return identifierIs(tag, length, "Registered Extensions") || identifierIs(tag, length, "Controlled Extensions");
+    return identifierIs(tag, length, "Registered Extensions") ||
+           identifierIs(tag, length, "Controlled Extensions");
 }
 static bool isOverflow21(const char* id, size_t length) {
     return identifierIs(id, length, "TRE_OVERFLOW");
@@ -181,7 +182,8 @@ void CNitfDataExtensionSource::readOverflowTags(CNitfFile* file, FILE* fp, CNitf
         CNitfProperty* field = FindProperty(m_properties, "DESOFLW");
         char padded[7];
         std::snprintf(padded, sizeof padded, "%-6s", name);
-        return field && field->getDataType() == CNitfProperty::eString && _stricmp(field->getAsString(), padded) == 0;
+        return field && field->getDataType() == CNitfProperty::eString &&
+               _stricmp(field->getAsString(), padded) == 0;
     };
     if (area("XHD") || area("UDHD")) {
         source = CNitfTag::eTagSourceFileHeaderDES;

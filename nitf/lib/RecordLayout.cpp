@@ -106,8 +106,9 @@ CRecordLayout::CRecordLayout(std::initializer_list<record::Part> parts) {
     for (int i = 0; i < count; ++i) {
         const Entry& entry = m_entries[i];
         checkEntry(entry, static_cast<int>(repeats.size()));
-        Node node = {&entry, -1, -1, -1, static_cast<int>(repeats.size()), repeats.empty() ? -1 : repeats.back(),
-                     0, -1, -1};
+        Node node = {
+            &entry, -1, -1, -1, static_cast<int>(repeats.size()), repeats.empty() ? -1 : repeats.back(),
+            0,      -1, -1};
         if (entry.op == Op::End) {
             if (open.empty())
                 tableFault("End without a group", nullptr);
@@ -172,8 +173,8 @@ void CRecordLayout::rankKeys() {
     m_rankCount = static_cast<int>(names.size());
     for (Node& node : m_nodes) {
         if (node.entry->op == Op::Field && node.depth == 0 && !(node.entry->flags & record::kNotKept))
-            node.rank = static_cast<int>(std::lower_bound(names.begin(), names.end(), node.entry->name, ltstr()) -
-                                         names.begin());
+            node.rank = static_cast<int>(
+                std::lower_bound(names.begin(), names.end(), node.entry->name, ltstr()) - names.begin());
     }
 }
 
