@@ -106,9 +106,7 @@ CRecordLayout::CRecordLayout(std::initializer_list<record::Part> parts) {
     for (int i = 0; i < count; ++i) {
         const Entry& entry = m_entries[i];
         checkEntry(entry, static_cast<int>(repeats.size()));
-        Node node = {
-            &entry, -1, -1, -1, static_cast<int>(repeats.size()), repeats.empty() ? -1 : repeats.back(),
-            0,      -1, -1};
+        Node node = {&entry, -1, -1, -1, static_cast<int>(repeats.size()), 0, -1, -1};
         if (entry.op == Op::End) {
             if (open.empty())
                 tableFault("End without a group", nullptr);

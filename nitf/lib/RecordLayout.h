@@ -301,7 +301,6 @@ public:
         int ref;            // index of the field named by entry->ref, or -1
         int other;          // index of the field named by entry->other (Product, Count fallback), or -1
         int depth;          // number of enclosing repeated groups
-        int repeat;         // index of the innermost enclosing Repeat, or -1
         long long minWidth; // Repeat: bytes one repetition needs at the least
         int span;           // the slot that keeps this field's value for later entries, or -1
         int rank;           // a kept field outside repeated groups: its key's place among those keys, or -1
