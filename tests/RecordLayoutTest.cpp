@@ -13,6 +13,7 @@
 #include "KeyStore.h"
 #include "NitfField.h"
 #include "RecordLayout.h"
+#include "SerializableRecord.h"
 #include "SerializerFileRaw.h"
 #include "SerializerQuery.h"
 #include "TestFiles.h"
@@ -188,4 +189,30 @@ TEST(RecordLayout, TextHoldingControlBytesShowsAsHexadecimal) {
     long long integer;
     bool isInteger;
     EXPECT_FALSE(nitfFieldNumber(text, &clean, &number, &integer, &isInteger));
+}
+
+TEST(RecordLayout, RecordsJoinTheSerializableFamily) {
+    static const CRecordLayout layout(kBinary);
+    nitf::CSerializableRecord record(layout);
+    SetProperty(record.getFields(), "ONE", new CNitfProperty(std::string("\x01", 1).c_str()));
+    std::string bytes = std::string("\x01", 1) + std::string(2 + 4 + 8 + 8 + 4 + 3 + 2, '\0');
+    // As one object of a larger serialization: the query records where it began and how long it was.
+    nitf::CSerializerQuery query;
+    query.addQuery(&record);
+    query << static_cast<unsigned short>(7);
+    query << record;
+    ASSERT_TRUE(query.getQueryInfo(&record));
+    EXPECT_EQ(query.getQueryInfo(&record)->offset, 2);
+    EXPECT_EQ(query.getQueryInfo(&record)->length, record.length());
+
+    std::unique_ptr<FILE, int (*)(FILE*)> out(std::tmpfile(), std::fclose);
+    nitf::CSerializerFileRaw writer(out.get(), true);
+    writer << record;
+    EXPECT_EQ(contents(out.get(), static_cast<long long>(bytes.size())), bytes);
+    DKFSeek64(out.get(), 0, SEEK_SET);
+    nitf::CSerializableRecord again(layout);
+    nitf::CSerializerFileRaw reader(out.get(), true);
+    reader >> again;
+    EXPECT_EQ(again.length(), static_cast<long long>(bytes.size()));
+    EXPECT_TRUE(FindProperty(again.getFields(), "ITEM_1"));
 }
