@@ -1,4 +1,5 @@
-// Opening a file and reading every sub-header of a file with 999 image segments and 999 data extensions.
+// Opening a file and reading every sub-header of a file with 999 image segments and 999 data extensions: the
+// "segments" rate gives the time per segment (the aim is 4 us or less), beside gdalinfo on the same file.
 #include <benchmark/benchmark.h>
 
 #include <cstdlib>

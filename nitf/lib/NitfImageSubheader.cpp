@@ -11,12 +11,9 @@
 #include "KeyStore.h"
 #include "MAPLOBExtension.h"
 #include "RPFIMGExtension.h"
-#include "Raise.h"
 #include "RecordLayout.h"
 #include "RpcSource.h"
 #include "TagAreas.h"
-
-static const char kSourceFile[] = "nitf/lib/NitfImageSubheader";
 
 CNitfImageSubheader::CNitfImageSubheader() : m_propertiesModified(false), m_keys(new CKeyStore) {}
 

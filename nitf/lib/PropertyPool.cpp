@@ -15,6 +15,8 @@
 #endif
 #endif
 
+#ifndef NITF_POOL_DISABLED
+
 namespace {
 
 // Block sizes, the first for property objects. Text blocks keep their size class in the byte before the
@@ -66,6 +68,8 @@ void give(int sizeClass, void* block) {
 }
 
 } // namespace
+
+#endif
 
 #ifdef NITF_POOL_DISABLED
 
