@@ -6,21 +6,32 @@ JOBS ?= $(shell nproc)
 FUZZ_SECONDS ?= 60
 FUZZ_SMOKE_SECONDS ?= 30
 CMAKE_FLAGS ?=
+PREFIX ?= /usr/local
 
-.PHONY: all deps build run test asan-test bench fuzz fuzz-build fuzz-smoke format clean
+.PHONY: all deps configure build tool run test install asan-test bench fuzz fuzz-build fuzz-smoke format clean
 
 all: build
 
 deps:
 	@bash scripts/install-deps.sh
 
-build: deps
+configure: deps
 	cmake -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=RelWithDebInfo $(CMAKE_FLAGS) >/dev/null
+
+build: configure
 	cmake --build $(BUILD) -j$(JOBS)
 
+# The tool and its libraries only: no tests or benchmarks.
+tool: configure
+	cmake --build $(BUILD) -j$(JOBS) --target nitf-tool
+
 # The main job: the nitf tool on the project's own sample.
-run: build
+run: tool
 	bash scripts/run-sample.sh $(BUILD)
+
+# The tool, the libraries, the headers and the package files under PREFIX (make install PREFIX=DIR).
+install: tool
+	cmake --install $(BUILD) --prefix $(PREFIX)
 
 test: build
 	ctest --test-dir $(BUILD) --output-on-failure -j$(JOBS)

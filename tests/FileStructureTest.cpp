@@ -73,7 +73,7 @@ TEST(FileStructure, VersionsAreDetectedFromTheFirstNineBytes) {
     EXPECT_EQ(sample.reader().getImageCount(), 1);
     OpenedSample old(std::string("NITF01.10") + std::string(500, ' '));
     EXPECT_EQ(old.reader().getImageCount(), 0);
-    EXPECT_TRUE(old.header()->getFieldNames().empty());
+    EXPECT_TRUE(old.header()->getFields().empty());
 }
 
 TEST(FileStructure, SegmentTablesChainFromTheHeaderLength) {

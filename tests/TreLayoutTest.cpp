@@ -10,16 +10,9 @@
 #include "NitfTag.h"
 #include "TestFiles.h"
 #include "TreBytes.h"
-#include "extensions/TreLayout.h"
+#include "RecordLayout.h"
 
 namespace {
-
-const char* const kBuiltNames[] = {"STDIDC", "AIMIDB", "ACFTB",  "USE00A", "STREOB", "PIAIMB", "PIAIMC",
-                                   "PIAPRC", "PIAPRD", "PIAPEA", "PIAPEB", "IOMAPA", "MSTGTA", "RPFHDR",
-                                   "RPFIMG", "ESD001", "J2KLRA", "HISTOA", "PIATGA", "PIATGB", "PIAEQA",
-                                   "PIAEVA", "GEOPSB", "MHUDTG", "MHXDTG", "IMUDTG", "IMXDTG", "JITCID",
-                                   "TESTIN", "ENGRDA", "BANDSB", "NBLOCA", "ICHIPB", "CSCRNA", "CSDIDA",
-                                   "CSEXRA", "CSSFAA", "PRJPSB", "CSPROA", "MAPLOB", "CSCCGA"};
 
 long long size(const std::string& bytes) {
     return static_cast<long long>(bytes.size());
@@ -303,7 +296,7 @@ TEST(TreRobustness, EveryParserOnEmptyShortAndGarbageData) {
         state = state * 1103515245u + 12345u;
         byte = static_cast<char>(state >> 16);
     }
-    for (const char* name : kBuiltNames) {
+    for (const char* name : CNitfExtension::getBuiltExtensionNames()) {
         auto none = parseTre(name, garbage, 0);
         EXPECT_TRUE(none->getProperties().empty()) << name;
         for (long long length : {5LL, 3000LL}) {
@@ -316,10 +309,10 @@ TEST(TreRobustness, EveryParserOnEmptyShortAndGarbageData) {
 }
 
 TEST(TreRobustness, MalformedTablesAreRefused) {
-    static const tre::Entry unclosed[] = {tre::Text("N", 1), tre::Repeat("N"), tre::Text("X", 1)};
-    static const tre::Entry unknown[] = {tre::Repeat("COUNT"), tre::Text("X", 1), tre::End()};
-    static const tre::Entry later[] = {tre::Repeat("N"), tre::Text("N", 1), tre::End()};
-    EXPECT_THROW(tre::Layout{unclosed}, vexo::Exception);
-    EXPECT_THROW(tre::Layout{unknown}, vexo::Exception);
-    EXPECT_THROW(tre::Layout{later}, vexo::Exception);
+    static const record::Entry unclosed[] = {record::Text("N", 1), record::Repeat("N"), record::Text("X", 1)};
+    static const record::Entry unknown[] = {record::Repeat("COUNT"), record::Text("X", 1), record::End()};
+    static const record::Entry later[] = {record::Repeat("N"), record::Text("N", 1), record::End()};
+    EXPECT_THROW(CRecordLayout{unclosed}, vexo::Exception);
+    EXPECT_THROW(CRecordLayout{unknown}, vexo::Exception);
+    EXPECT_THROW(CRecordLayout{later}, vexo::Exception);
 }

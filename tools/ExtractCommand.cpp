@@ -13,8 +13,7 @@
 #include <thread>
 #include <vector>
 
-#include <getopt.h>
-
+#include "CommandLine.h"
 #include "Commands.h"
 #include "HostError.h"
 #include "NitfFileReader.h"
@@ -27,35 +26,12 @@
 
 namespace {
 
-const char kUsage[] =
-    "usage: nitf extract FILE -f raw|png|pgm|tiff -o OUT [options]\n"
-    "\n"
-    "Decodes an image segment.\n"
-    "  raw   the canonical samples: band after band, each band's rows top first, each sample in\n"
-    "        ceil(NBPP/8) bytes big-endian as stored (0 or 1 for NBPP 1)\n"
-    "  png   a picture for looking at (look-up tables applied, three bands as RGB); pgm: the same as "
-    "PGM/PPM\n"
-    "  tiff  a GeoTIFF of the samples in their own types, with the image's corners, RPC model, colour map "
-    "and\n"
-    "        pad value (the whole image, into a file)\n"
-    "OUT may be - for standard output (raw, png, pgm).\n"
-    "\n"
-    "  -i, --image N          image segment, from 0 (default 0)\n"
-    "  -b, --band N           one band, from 0\n"
-    "      --bands LIST       bands, from 0, in this order: 0,2,1\n"
-    "      --window X,Y,W,H   part of the image: W x H pixels from column X, row Y\n"
-    "      --level N          a reduced resolution level (JPEG 2000): the image halved N times; the window\n"
-    "                         is at that level\n"
-    "  -j, --threads N        decoding (raw) or compressing (tiff) threads (default: the processors)\n"
-    "      --cog              tiff: Cloud-Optimized (tiled, compressed, internal overviews)\n"
-    "      --compress C       tiff: deflate (the default), zstd or none\n"
-    "      --allow-partial    exit 0 even when blocks could not be decoded (they are written as zeros)\n"
-    "  -h, --help             this text\n";
-
 class UsageError : public std::runtime_error {
 public:
     using std::runtime_error::runtime_error;
 };
+
+enum { kBands = 1000, kWindow, kLevel, kAllowPartial, kCog, kCompress };
 
 struct Options {
     std::string file;
@@ -91,82 +67,54 @@ std::vector<int> parseList(const std::string& text, const char* what) {
     }
 }
 
-Options parseOptions(int argc, char** argv) {
-    enum { kBands = 1000, kWindow, kLevel, kAllowPartial, kCog, kCompress };
-    static const option longOptions[] = {{"image", required_argument, nullptr, 'i'},
-                                         {"band", required_argument, nullptr, 'b'},
-                                         {"bands", required_argument, nullptr, kBands},
-                                         {"window", required_argument, nullptr, kWindow},
-                                         {"level", required_argument, nullptr, kLevel},
-                                         {"format", required_argument, nullptr, 'f'},
-                                         {"output", required_argument, nullptr, 'o'},
-                                         {"threads", required_argument, nullptr, 'j'},
-                                         {"allow-partial", no_argument, nullptr, kAllowPartial},
-                                         {"cog", no_argument, nullptr, kCog},
-                                         {"compress", required_argument, nullptr, kCompress},
-                                         {"help", no_argument, nullptr, 'h'},
-                                         {nullptr, 0, nullptr, 0}};
-    // getopt wants the program's name first.
-    std::vector<char*> args{const_cast<char*>("nitf extract")};
-    args.insert(args.end(), argv, argv + argc);
-    args.push_back(nullptr);
-    optind = 0;
-    opterr = 0;
-    Options options;
-    for (int c; (c = getopt_long(argc + 1, args.data(), ":i:b:f:o:j:h", longOptions, nullptr)) != -1;) {
-        switch (c) {
-        case 'i':
-            options.image = parseNumber(optarg, "image index");
-            break;
-        case 'b':
-            options.bands = {parseNumber(optarg, "band")};
-            break;
-        case kBands:
-            options.bands = parseList(optarg, "band list");
-            break;
-        case kWindow: {
-            const std::vector<int> w = parseList(optarg, "window");
-            if (w.size() != 4)
-                throw UsageError(std::string("a window is X,Y,WIDTH,HEIGHT, not '") + optarg + "'");
-            options.window = {w[0], w[1], w[2], w[3]};
-            if (options.window.width == 0 || options.window.height == 0)
-                throw UsageError(std::string("an empty window '") + optarg + "'");
-            break;
-        }
-        case kLevel:
-            options.level = parseNumber(optarg, "level");
-            break;
-        case 'f':
-            options.format = optarg;
-            break;
-        case 'o':
-            options.output = optarg;
-            break;
-        case 'j':
-            options.threads = parseNumber(optarg, "thread count");
-            break;
-        case kAllowPartial:
-            options.allowPartial = true;
-            break;
-        case kCog:
-            options.cog = true;
-            break;
-        case kCompress:
-            options.compression = optarg;
-            break;
-        case 'h':
-            throw UsageError("");
-        case ':':
-            throw UsageError(std::string("option ") + args[optind - 1] + " needs a value");
-        default:
-            throw UsageError(std::string("unknown option ") + args[optind - 1]);
-        }
+// One option into `options`; throws UsageError for a value it cannot take.
+void takeOption(int code, const char* value, Options& options) {
+    switch (code) {
+    case 'i':
+        options.image = parseNumber(value, "image index");
+        break;
+    case 'b':
+        options.bands = {parseNumber(value, "band")};
+        break;
+    case kBands:
+        options.bands = parseList(value, "band list");
+        break;
+    case kWindow: {
+        const std::vector<int> w = parseList(value, "window");
+        if (w.size() != 4)
+            throw UsageError(std::string("a window is X,Y,WIDTH,HEIGHT, not '") + value + "'");
+        options.window = {w[0], w[1], w[2], w[3]};
+        if (options.window.width == 0 || options.window.height == 0)
+            throw UsageError(std::string("an empty window '") + value + "'");
+        break;
     }
-    for (int i = optind; i <= argc; ++i) {
-        if (!options.file.empty())
-            throw UsageError("more than one input file");
-        options.file = args[i];
+    case kLevel:
+        options.level = parseNumber(value, "level");
+        break;
+    case 'f':
+        options.format = value;
+        break;
+    case 'o':
+        options.output = value;
+        break;
+    case 'j':
+        options.threads = parseNumber(value, "thread count");
+        break;
+    case kAllowPartial:
+        options.allowPartial = true;
+        break;
+    case kCog:
+        options.cog = true;
+        break;
+    case kCompress:
+        options.compression = value;
+        break;
+    default:
+        throw UsageError("unknown option");
     }
+}
+
+void checkOptions(Options& options) {
     if (options.file.empty() || options.output.empty() || options.format.empty())
         throw UsageError("FILE, -f and -o are required");
     if (options.format != "raw" && options.format != "png" && options.format != "pgm" &&
@@ -181,7 +129,6 @@ Options parseOptions(int argc, char** argv) {
         throw UsageError("a GeoTIFF is of the whole image, at full resolution, into a file");
     if (options.threads == 0)
         options.threads = static_cast<int>(std::max(1u, std::thread::hardware_concurrency()));
-    return options;
 }
 
 CNitfImageSource* openImage(CNitfFileReader& reader, int image) {
@@ -279,21 +226,46 @@ int extract(const Options& options) {
 } // namespace
 
 int runExtract(int argc, char** argv) {
+    cli::Options parser(*cli::findCommand("extract"),
+                        {{"image", required_argument, nullptr, 'i'},
+                         {"band", required_argument, nullptr, 'b'},
+                         {"bands", required_argument, nullptr, kBands},
+                         {"window", required_argument, nullptr, kWindow},
+                         {"level", required_argument, nullptr, kLevel},
+                         {"format", required_argument, nullptr, 'f'},
+                         {"output", required_argument, nullptr, 'o'},
+                         {"threads", required_argument, nullptr, 'j'},
+                         {"allow-partial", no_argument, nullptr, kAllowPartial},
+                         {"cog", no_argument, nullptr, kCog},
+                         {"compress", required_argument, nullptr, kCompress}},
+                        "i:b:f:o:j:");
     Options options;
-    try {
-        options = parseOptions(argc, argv);
-    } catch (const UsageError& e) {
-        if (!*e.what()) {
-            std::fputs(kUsage, stdout);
-            return 0;
+    std::string problem;
+    const int status = parser.parse(argc, argv, [&](int code, const char* value) {
+        try {
+            takeOption(code, value, options);
+            return true;
+        } catch (const UsageError& e) {
+            problem = e.what();
+            std::fprintf(stderr, "nitf extract: %s\n", e.what());
+            return false;
         }
-        std::fprintf(stderr, "nitf extract: %s\n%s", e.what(), kUsage);
-        return 2;
+    });
+    if (status >= 0)
+        return status;
+    try {
+        if (parser.operands().size() > 1)
+            throw UsageError("more than one input file");
+        if (!parser.operands().empty())
+            options.file = parser.operands().front();
+        checkOptions(options);
+    } catch (const UsageError& e) {
+        return parser.usageError(e.what());
     }
     try {
         return extract(options);
     } catch (const std::exception& e) {
-        std::fprintf(stderr, "nitf extract: %s: %s\n", options.file.c_str(), e.what());
+        cli::reportError("extract", options.file, e.what());
     }
     return 1;
 }

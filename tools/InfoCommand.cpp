@@ -1,17 +1,18 @@
-// nitf info: what a user needs to understand a file, as aligned text or as one JSON object.
+// nitf info: what a user needs to understand a file, as aligned text or as JSON. Both forms come from one
+// description of the file: fields in file order as their raw texts, binary values as numbers, and a summary
+// of each image with its numbers as numbers.
 #include <cstdio>
 #include <cstring>
 #include <memory>
-#include <stdexcept>
 #include <string>
-#include <utility>
 #include <vector>
 
+#include <nlohmann/json.hpp>
+
+#include "CommandLine.h"
 #include "Commands.h"
-#include "HostConfig.h"
 #include "HostError.h"
 #include "HostFile.h"
-#include "JsonWriter.h"
 #include "NitfDataExtensionSource.h"
 #include "NitfExtension.h"
 #include "NitfFileHeader.h"
@@ -24,96 +25,175 @@
 
 namespace {
 
-struct TreEntry {
-    std::string tag;
-    long long length;
-    int source;
-    int occurrence;
-    int total;
-    std::vector<std::pair<std::string, std::string>> fields; // parsed fields, "TRE.FIELD" keys
-    std::string error;
-};
-
-// One header or sub-header: its fields in file order, its TREs, and summary lines for the text form.
-struct Section {
-    std::vector<std::pair<std::string, std::string>> fields;
-    std::vector<TreEntry> tres;
-    std::vector<std::string> summary;
-};
-
-struct FileInfo {
-    std::string version;
-    int versionCode = eNitfVersionUnknown;
-    Section header;
-    int counts[6] = {0, 0, 0, 0, 0, 0}; // image, graphic, label, text, des, res
-    std::vector<Section> images, graphics, labels, texts, des;
-};
+using Json = nlohmann::ordered_json;
 
 const char* const kSourceNames[] = {"unknown",       "file header", "file header (DES)",
                                     "image",         "image (DES)", "graphic",
                                     "graphic (DES)", "text",        "text (DES)"};
+
+struct Settings {
+    bool json = false;
+    std::string tre; // show only the TREs of this identifier
+};
 
 std::string trimmed(std::string text) {
     text.erase(text.find_last_not_of(' ') + 1);
     return text;
 }
 
-// A field's value as stored: text without trailing blanks, raw bytes as hex digits, numbers in decimal.
-std::string fieldText(CNitfProperty* value) {
-    if (!value || value->getDataType() == CNitfProperty::eNone)
-        return std::string();
-    return value->getDataType() == CNitfProperty::eString ? trimmed(value->toText()) : value->toText();
+// A field's value for the JSON: a number for binary numbers, else the text people read.
+Json fieldValue(const NitfField_t& field, CNitfProperty* value) {
+    double number = 0;
+    long long integer = 0;
+    bool isInteger = false;
+    if (nitfFieldNumber(field, value, &number, &integer, &isInteger))
+        return isInteger ? Json(integer) : Json(number);
+    return nitfFieldDisplayText(field, value);
 }
 
-std::string format(const char* fmt, long long a, long long b = 0, long long c = 0, long long d = 0) {
-    char text[256];
-    std::snprintf(text, sizeof text, fmt, a, b, c, d);
-    return text;
-}
-
-void addFields(Section& section, PropertyMap& map, const std::vector<const char*>& names) {
-    for (const char* name : names)
-        section.fields.emplace_back(name, fieldText(FindProperty(map, name)));
-}
-
-// The fields of a TRE the library parses, as its metadata entries.
-void parseTre(CNitfTag* tag, FILE* fp, TreEntry& entry) {
-    std::unique_ptr<CNitfExtension> extension(CNitfExtension::Build(tag));
-    if (!extension)
-        return;
-    char** list = nullptr;
-    try {
-        extension->readNewInfo(fp, false);
-        extension->asMetadata(list, nullptr, nullptr);
-    } catch (const vexo::Exception& e) {
-        entry.error = e.what();
+Json fieldsOf(PropertyMap& map, const std::vector<NitfField_t>& fields) {
+    Json object = Json::object();
+    for (const NitfField_t& field : fields) {
+        if (CNitfProperty* value = FindProperty(map, field.name))
+            object[field.name] = fieldValue(field, value);
     }
-    for (int i = 0; list && list[i]; ++i) {
-        std::string item = list[i];
-        size_t equals = item.find('=');
-        entry.fields.emplace_back(item.substr(0, equals),
-                                  equals == std::string::npos ? "" : trimmed(item.substr(equals + 1)));
-    }
-    DestroyStringList(list);
+    return object;
 }
 
-void addTres(Section& section, const std::list<CNitfTag*>& tags, FILE* fp) {
+// The TREs of a list, each with its fields in file order when the library parses it.
+Json tresOf(const std::list<CNitfTag*>& tags, FILE* fp, const Settings& settings) {
+    Json list = Json::array();
     for (CNitfTag* tag : tags) {
-        TreEntry entry{trimmed(tag->getIdentifier()),
-                       tag->getDataLength(),
-                       tag->getSource(),
-                       tag->getOccurrence(),
-                       tag->getTotal(),
-                       {},
-                       {}};
-        parseTre(tag, fp, entry);
-        section.tres.push_back(entry);
+        std::string name = trimmed(tag->getIdentifier());
+        if (!settings.tre.empty() && name != settings.tre)
+            continue;
+        Json tre = {{"tag", name},
+                    {"length", tag->getDataLength()},
+                    {"source", static_cast<int>(tag->getSource())},
+                    {"occurrence", tag->getOccurrence()},
+                    {"total", tag->getTotal()}};
+        std::unique_ptr<CNitfExtension> extension(CNitfExtension::Build(tag));
+        if (extension) {
+            try {
+                extension->readNewInfo(fp, false);
+                tre["fields"] = fieldsOf(extension->getProperties(), extension->getFields());
+            } catch (const vexo::Exception& e) {
+                tre["error"] = e.what();
+            }
+        }
+        list.push_back(tre);
     }
+    return list;
+}
+
+long long numberOf(PropertyMap& map, const char* name) {
+    CNitfProperty* value = FindProperty(map, name);
+    return value && value->getDataType() != CNitfProperty::eNone ? value->getAsInt64() : 0;
+}
+
+Json textOf(PropertyMap& map, const char* name) {
+    CNitfProperty* value = FindProperty(map, name);
+    if (!value || value->getDataType() == CNitfProperty::eNone)
+        return nullptr;
+    return trimmed(value->toText());
+}
+
+// What the text form's summary lines say, with numbers as numbers.
+Json imageSummary(CNitfImageSubheader& subheader, const CNitfHeaderDataPair* pair) {
+    PropertyMap& map = subheader.getProperties();
+    static const char* const modes[] = {"S", "B", "P", "R", "?"};
+    CNitfImagePropertiesIF geometry;
+    PropertyMap copy = map; // setProperties inserts the fields it misses: keep them out of the sub-header
+    geometry.setProperties(copy);
+    for (auto& entry : copy) {
+        if (!FindProperty(map, entry.first))
+            delete entry.second;
+    }
+    Json summary = {{"NROWS", numberOf(map, "NROWS")},
+                    {"NCOLS", numberOf(map, "NCOLS")},
+                    {"bands", subheader.getBandCount()},
+                    {"NBPP", numberOf(map, "NBPP")},
+                    {"ABPP", numberOf(map, "ABPP")},
+                    {"PVTYPE", textOf(map, "PVTYPE")},
+                    {"IREP", textOf(map, "IREP")},
+                    {"IMODE", textOf(map, "IMODE")},
+                    {"IC", textOf(map, "IC")},
+                    {"COMRAT", textOf(map, "COMRAT")},
+                    {"NBPR", numberOf(map, "NBPR")},
+                    {"NBPC", numberOf(map, "NBPC")},
+                    {"NPPBH", numberOf(map, "NPPBH")},
+                    {"NPPBV", numberOf(map, "NPPBV")},
+                    {"blockWidth", geometry.getTileWidth()},
+                    {"blockHeight", geometry.getTileHeight()},
+                    {"interleaving", modes[geometry.getInterleavingType()]},
+                    {"geometryValid", geometry.dataValid()}};
+    Json luts = Json::array();
+    for (int i = 0; i < subheader.getLutCount(); ++i) {
+        CNitfLutSource* lut = subheader.getLutSource(i);
+        luts.push_back({{"band", lut->getBand()},
+                        {"entries", lut->getEntryCount()},
+                        {"entrySize", lut->getEntrySize()}});
+    }
+    summary["luts"] = luts;
+    summary["dataOffset"] = pair ? pair->getDataOffset() : 0;
+    summary["dataLength"] = pair ? pair->getDataLength() : 0;
+    // The corners as the file gives them.
+    summary["ICORDS"] =
+        FindProperty(map, "ICORDS") ? Json(FindProperty(map, "ICORDS")->toText()) : Json(nullptr);
+    if (FindProperty(map, "IGEOLO1")) {
+        Json corners = Json::array();
+        for (const char* corner : {"IGEOLO1", "IGEOLO2", "IGEOLO3", "IGEOLO4"})
+            corners.push_back(FindProperty(map, corner) ? FindProperty(map, corner)->toText()
+                                                        : std::string());
+        summary["IGEOLO"] = corners;
+    } else {
+        summary["IGEOLO"] = nullptr;
+    }
+    return summary;
+}
+
+Json describeImage(CNitfImageSubheader& subheader, const CNitfHeaderDataPair* pair, FILE* fp,
+                   const Settings& settings) {
+    Json image = {{"summary", imageSummary(subheader, pair)},
+                  {"subheader", fieldsOf(subheader.getProperties(), subheader.getFields())},
+                  {"tres", tresOf(subheader.getTaggedRecords(), fp, settings)}};
+    Json comments = Json::array();
+    for (int i = 0; i < subheader.getCommentCount(); ++i) {
+        char comment[82];
+        subheader.readComment(fp, i, comment);
+        comment[80] = '\0';
+        comments.push_back(trimmed(comment));
+    }
+    image["comments"] = comments;
+    return image;
+}
+
+Json describeSegment(CNitfSegmentSource& segment, const std::list<CNitfTag*>& tags, FILE* fp,
+                     const Settings& settings) {
+    return {{"subheader", fieldsOf(segment.getProperties(), segment.getFields())},
+            {"tres", tresOf(tags, fp, settings)},
+            {"dataOffset", segment.getDataOffset()},
+            {"dataLength", segment.getDataLength()}};
+}
+
+Json describeDes(CNitfDataExtensionSource& des, FILE* fp, const Settings& settings) {
+    Json segment = describeSegment(des, des.getOverflowTags(), fp, settings);
+    Json kinds = Json::array();
+    if (des.isOverflow())
+        kinds.push_back("TRE overflow");
+    if (des.isStreamingFileHeader())
+        kinds.push_back("streaming file header");
+    if (des.isXMLDES())
+        kinds.push_back("XML data");
+    if (des.isCloudShape())
+        kinds.push_back("cloud shape");
+    segment["kinds"] = kinds;
+    return segment;
 }
 
 // The file header's fields, with each segment table's lengths right after its count, as they stand in the
 // file.
-Section describeHeader(CNitfFileHeader* header, FILE* fp) {
+Json describeHeader(CNitfFileHeader& header) {
     struct Table {
         const char* count;
         const char* headerName;
@@ -129,280 +209,213 @@ Section describeHeader(CNitfFileHeader* header, FILE* fp) {
         {"NUMDES", "LDSH", "LD", 4, 9, &CNitfFileHeader::getDataExtensionHeaderDataPair},
         {"NUMRES", "LRESH", "LRE", 4, 7, &CNitfFileHeader::getReservedExtensionHeaderDataPair},
     };
-    Section section;
-    for (const char* name : header->getFieldNames()) {
-        section.fields.emplace_back(name, fieldText(FindProperty(header->getProperties(), name)));
+    Json fields = Json::object();
+    for (const NitfField_t& field : header.getFields()) {
+        fields[field.name] = fieldValue(field, FindProperty(header.getProperties(), field.name));
         for (const Table& table : tables) {
-            if (std::strcmp(name, table.count) != 0)
+            if (std::strcmp(field.name, table.count) != 0)
                 continue;
-            for (int i = 0; CNitfHeaderDataPair* pair = (header->*table.pair)(i); ++i) {
-                std::string number = format("%03lld", i + 1);
-                section.fields.emplace_back(table.headerName + number,
-                                            format("%0*lld", table.headerWidth, pair->getHeaderLength()));
-                section.fields.emplace_back(table.dataName + number,
-                                            format("%0*lld", table.dataWidth, pair->getDataLength()));
+            for (int i = 0; CNitfHeaderDataPair* pair = (header.*table.pair)(i); ++i) {
+                char name[32], value[32];
+                std::snprintf(name, sizeof name, "%s%03d", table.headerName, i + 1);
+                std::snprintf(value, sizeof value, "%0*lld", table.headerWidth, pair->getHeaderLength());
+                fields[name] = value;
+                std::snprintf(name, sizeof name, "%s%03d", table.dataName, i + 1);
+                std::snprintf(value, sizeof value, "%0*lld", table.dataWidth, pair->getDataLength());
+                fields[name] = value;
             }
         }
     }
-    addTres(section, header->getTaggedRecords(), fp);
-    return section;
+    return fields;
 }
 
-Section describeImage(CNitfImageSubheader* subheader, FILE* fp) {
-    Section section;
-    addFields(section, subheader->getProperties(), subheader->getFieldNames());
-    addTres(section, subheader->getTaggedRecords(), fp);
-
-    CNitfImagePropertiesIF geometry;
-    PropertyMap& map = subheader->getProperties();
-    geometry.setProperties(map);
-    static const char* const modes[] = {"S", "B", "P", "R", "?"};
-    std::string comrat =
-        FindProperty(map, "COMRAT") ? " (COMRAT " + fieldText(FindProperty(map, "COMRAT")) + ")" : "";
-    section.summary.push_back(
-        format("%lld x %lld pixels, %lld band(s) of %lld bits", geometry.getImageActualWidth(),
-               geometry.getImageActualHeight(), geometry.getBandCount(), geometry.getBpp()) +
-        format(" (ABPP %lld)", geometry.getActualBpp()) + ", IMODE " + modes[geometry.getInterleavingType()]);
-    section.summary.push_back(
-        format("%lld x %lld blocks of %lld x %lld", geometry.getTileCountX(), geometry.getTileCountY(),
-               geometry.getTileWidth(), geometry.getTileHeight()) +
-        ", IC " + fieldText(FindProperty(map, "IC")) + comrat + ", IREP " +
-        fieldText(FindProperty(map, "IREP")) + ", PVTYPE " + fieldText(FindProperty(map, "PVTYPE")));
-    for (int i = 0; i < subheader->getLutCount(); ++i) {
-        CNitfLutSource* lut = subheader->getLutSource(i);
-        section.summary.push_back(format("LUT: band %lld, %lld entries of %lld byte(s)", lut->getBand(),
-                                         lut->getEntryCount(), lut->getEntrySize()));
-    }
-    for (int i = 0; i < subheader->getCommentCount(); ++i) {
-        char comment[82];
-        subheader->readComment(fp, i, comment);
-        comment[80] = '\0';
-        section.summary.push_back("comment: " + trimmed(comment));
-    }
-    if (FindProperty(map, "IGEOLO1")) {
-        std::string corners = "corners (ICORDS " + fieldText(FindProperty(map, "ICORDS")) + "):";
-        for (const char* corner : {"IGEOLO1", "IGEOLO2", "IGEOLO3", "IGEOLO4"})
-            corners += " " + FindProperty(map, corner)->toText();
-        section.summary.push_back(corners);
-    }
-    if (!geometry.dataValid())
-        section.summary.push_back("geometry is not valid for decoding");
-    return section;
-}
-
-Section describeSegment(CNitfSegmentSource& segment, FILE* fp) {
-    Section section;
-    addFields(section, segment.getProperties(), segment.getFieldNames());
-    addTres(section, segment.getTaggedRecords(), fp);
-    section.summary.push_back(
-        format("data: %lld bytes at offset %lld", segment.getDataLength(), segment.getDataOffset()));
-    return section;
-}
-
-Section describeDes(CNitfDataExtensionSource& des, FILE* fp) {
-    Section section = describeSegment(des, fp);
-    section.tres.clear();
-    addTres(section, des.getOverflowTags(), fp);
-    if (des.isOverflow())
-        section.summary.push_back(
-            format("TRE overflow: %lld TRE(s)", static_cast<long long>(des.getOverflowTags().size())));
-    if (des.isStreamingFileHeader())
-        section.summary.push_back(
-            format("streaming file header: %lld-byte replacement header", des.getStreamingHeaderLength()));
-    if (des.isXMLDES())
-        section.summary.push_back("XML data");
-    if (des.isCloudShape())
-        section.summary.push_back("cloud shape");
-    return section;
-}
-
-FileInfo collect(const char* path) {
-    FileInfo info;
+Json describe(const std::string& path, const Settings& settings) {
     CNitfFileReader reader;
-    if (!reader.open(path))
-        throw std::runtime_error(std::string("cannot open ") + path);
+    if (!reader.open(path.c_str()))
+        throw std::runtime_error(std::string("cannot open the file: ") + std::strerror(errno));
     CNitfFileHeader* header = reader.getFileHeader();
     FILE* fp = reader.getInputStream();
 
     char version[10] = {0};
     DKFSeek64(fp, 0, SEEK_SET);
     DKFRead(version, 1, 9, fp);
-    info.version = version;
-    info.versionCode = header->getVersion();
-    info.counts[0] = header->getImageCount();
-    info.counts[1] = header->getSymbolCount();
-    info.counts[2] = header->getLabelCount();
-    info.counts[3] = header->getTextCount();
-    info.counts[4] = header->getDataExtensionCount();
-    info.counts[5] = header->getReservedExtensionCount();
+    Json info = {
+        {"file", path}, {"version", version}, {"versionCode", static_cast<int>(header->getVersion())}};
+    info["segments"] = {
+        {"image", header->getImageCount()},       {"graphic", header->getSymbolCount()},
+        {"label", header->getLabelCount()},       {"text", header->getTextCount()},
+        {"des", header->getDataExtensionCount()}, {"res", header->getReservedExtensionCount()}};
 
     // Overflow segments first: their TREs join the lists of the headers they overflowed from.
-    for (int i = 0; i < info.counts[4]; ++i) {
-        std::unique_ptr<CNitfDataExtensionSource> des(reader.getNewDataExtensionSource(i));
-        info.des.push_back(describeDes(*des, fp));
+    Json des = Json::array();
+    for (int i = 0; i < header->getDataExtensionCount(); ++i) {
+        std::unique_ptr<CNitfDataExtensionSource> segment(reader.getNewDataExtensionSource(i));
+        des.push_back(describeDes(*segment, fp, settings));
     }
-    for (int i = 0; i < info.counts[0]; ++i) {
+    Json images = Json::array();
+    for (int i = 0; i < header->getImageCount(); ++i) {
         std::unique_ptr<CNitfImageSubheader> subheader(header->getNewImageSubheader(fp, i));
-        info.images.push_back(describeImage(subheader.get(), fp));
+        images.push_back(describeImage(*subheader, header->getImageHeaderDataPair(i), fp, settings));
     }
-    for (int i = 0; i < info.counts[1]; ++i) {
+    Json graphics = Json::array(), labels = Json::array(), texts = Json::array();
+    for (int i = 0; i < header->getSymbolCount(); ++i) {
         std::unique_ptr<CNitfSymbolSource> graphic(reader.getNewSymbolSource(i));
-        info.graphics.push_back(describeSegment(*graphic, fp));
+        graphics.push_back(describeSegment(*graphic, graphic->getTaggedRecords(), fp, settings));
     }
-    for (int i = 0; i < info.counts[2]; ++i) {
+    for (int i = 0; i < header->getLabelCount(); ++i) {
         std::unique_ptr<CNitfLabelSource> label(reader.getNewLabelSource(i));
-        info.labels.push_back(describeSegment(*label, fp));
+        labels.push_back(describeSegment(*label, label->getTaggedRecords(), fp, settings));
     }
-    for (int i = 0; i < info.counts[3]; ++i) {
+    for (int i = 0; i < header->getTextCount(); ++i) {
         std::unique_ptr<CNitfTextSource> text(reader.getNewTextSource(i));
-        info.texts.push_back(describeSegment(*text, fp));
+        texts.push_back(describeSegment(*text, text->getTaggedRecords(), fp, settings));
     }
-    info.header = describeHeader(header, fp);
+    info["header"] = describeHeader(*header);
+    info["tres"] = tresOf(header->getTaggedRecords(), fp, settings);
+    info["images"] = images;
+    info["graphics"] = graphics;
+    info["labels"] = labels;
+    info["texts"] = texts;
+    info["des"] = des;
     return info;
-}
-
-// ---- JSON
-// ---------------------------------------------------------------------------------------------------
-
-void writeTres(JsonWriter& json, const std::vector<TreEntry>& tres) {
-    json.beginArray("tres");
-    for (const TreEntry& tre : tres) {
-        json.beginObject();
-        json.value("tag", tre.tag);
-        json.value("length", tre.length);
-        json.value("source", static_cast<long long>(tre.source));
-        json.value("occurrence", static_cast<long long>(tre.occurrence));
-        json.value("total", static_cast<long long>(tre.total));
-        if (!tre.fields.empty()) {
-            json.beginObject("fields");
-            for (const auto& field : tre.fields)
-                json.value(field.first.c_str(), field.second);
-            json.endObject();
-        }
-        if (!tre.error.empty())
-            json.value("error", tre.error);
-        json.endObject();
-    }
-    json.endArray();
-}
-
-void writeFields(JsonWriter& json, const char* key, const Section& section) {
-    json.beginObject(key);
-    for (const auto& field : section.fields)
-        json.value(field.first.c_str(), field.second);
-    json.endObject();
-}
-
-void writeSegments(JsonWriter& json, const char* key, const std::vector<Section>& sections) {
-    json.beginArray(key);
-    for (const Section& section : sections) {
-        json.beginObject();
-        writeFields(json, "subheader", section);
-        writeTres(json, section.tres);
-        json.endObject();
-    }
-    json.endArray();
-}
-
-void printJson(const FileInfo& info) {
-    JsonWriter json(stdout);
-    json.beginObject();
-    json.value("version", info.version);
-    json.value("versionCode", static_cast<long long>(info.versionCode));
-    writeFields(json, "header", info.header);
-    json.beginObject("segments");
-    const char* const names[] = {"image", "graphic", "label", "text", "des", "res"};
-    for (int i = 0; i < 6; ++i)
-        json.value(names[i], static_cast<long long>(info.counts[i]));
-    json.endObject();
-    writeTres(json, info.header.tres);
-    writeSegments(json, "images", info.images);
-    writeSegments(json, "graphics", info.graphics);
-    writeSegments(json, "labels", info.labels);
-    writeSegments(json, "texts", info.texts);
-    writeSegments(json, "des", info.des);
-    json.endObject();
-    json.finish();
 }
 
 // ---- text
 // ---------------------------------------------------------------------------------------------------
 
-void printSection(const Section& section, const char* indent) {
-    for (const std::string& line : section.summary)
-        std::printf("%s%s\n", indent, line.c_str());
+std::string plain(const Json& value) {
+    return value.is_string() ? value.get<std::string>() : value.dump();
+}
+
+void printFields(const Json& fields, const char* indent) {
     size_t width = 0;
-    for (const auto& field : section.fields)
-        width = std::max(width, field.first.size());
-    for (const auto& field : section.fields)
-        std::printf("%s  %-*s  %s\n", indent, static_cast<int>(width), field.first.c_str(),
-                    field.second.c_str());
-    for (const TreEntry& tre : section.tres) {
-        std::printf("%s  TRE %-6s %6lld bytes, %s", indent, tre.tag.c_str(), tre.length,
-                    tre.source >= 0 && tre.source <= 8 ? kSourceNames[tre.source] : "?");
-        if (tre.occurrence)
-            std::printf(", occurrence %d of %d", tre.occurrence, tre.total);
+    for (auto& item : fields.items())
+        width = std::max(width, item.key().size());
+    for (auto& item : fields.items())
+        std::printf("%s%-*s  %s\n", indent, static_cast<int>(width), item.key().c_str(),
+                    plain(item.value()).c_str());
+}
+
+void printTres(const Json& tres, const char* indent) {
+    for (const Json& tre : tres) {
+        int source = tre["source"].get<int>();
+        std::printf("%sTRE %-6s %6lld bytes, %s", indent, tre["tag"].get<std::string>().c_str(),
+                    tre["length"].get<long long>(), source >= 0 && source <= 8 ? kSourceNames[source] : "?");
+        if (tre["occurrence"].get<int>())
+            std::printf(", occurrence %d of %d", tre["occurrence"].get<int>(), tre["total"].get<int>());
         std::printf("\n");
-        size_t width = 0;
-        for (const auto& field : tre.fields)
-            width = std::max(width, field.first.size());
-        for (const auto& field : tre.fields)
-            std::printf("%s      %-*s  %s\n", indent, static_cast<int>(width), field.first.c_str(),
-                        field.second.c_str());
-        if (!tre.error.empty())
-            std::printf("%s      (not parsed: %s)\n", indent, tre.error.c_str());
+        std::string inner = std::string(indent) + "    ";
+        if (tre.contains("fields"))
+            printFields(tre["fields"], inner.c_str());
+        if (tre.contains("error"))
+            std::printf("%s(not parsed: %s)\n", inner.c_str(), tre["error"].get<std::string>().c_str());
     }
 }
 
-void printSegments(const char* kind, const std::vector<Section>& sections) {
-    for (size_t i = 0; i < sections.size(); ++i) {
+void printImageSummary(const Json& s) {
+    std::printf("  %lld x %lld pixels, %d band(s) of %lld bits (ABPP %lld), PVTYPE %s, IREP %s, IMODE %s\n",
+                s["NCOLS"].get<long long>(), s["NROWS"].get<long long>(), s["bands"].get<int>(),
+                s["NBPP"].get<long long>(), s["ABPP"].get<long long>(), plain(s["PVTYPE"]).c_str(),
+                plain(s["IREP"]).c_str(), plain(s["IMODE"]).c_str());
+    std::printf("  %lld x %lld blocks of %d x %d, IC %s", s["NBPR"].get<long long>(),
+                s["NBPC"].get<long long>(), s["blockWidth"].get<int>(), s["blockHeight"].get<int>(),
+                plain(s["IC"]).c_str());
+    if (!s["COMRAT"].is_null())
+        std::printf(" (COMRAT %s)", plain(s["COMRAT"]).c_str());
+    std::printf(", data %lld bytes at offset %lld\n", s["dataLength"].get<long long>(),
+                s["dataOffset"].get<long long>());
+    for (const Json& lut : s["luts"])
+        std::printf("  LUT: band %d, %d entries of %d byte(s)\n", lut["band"].get<int>(),
+                    lut["entries"].get<int>(), lut["entrySize"].get<int>());
+    if (!s["IGEOLO"].is_null()) {
+        std::printf("  corners (ICORDS %s):", plain(s["ICORDS"]).c_str());
+        for (const Json& corner : s["IGEOLO"])
+            std::printf(" %s", plain(corner).c_str());
+        std::printf("\n");
+    }
+    if (!s["geometryValid"].get<bool>())
+        std::printf("  geometry is not valid for decoding\n");
+}
+
+void printSegments(const char* kind, const Json& segments) {
+    for (size_t i = 0; i < segments.size(); ++i) {
+        const Json& segment = segments[i];
         std::printf("\n%s %zu:\n", kind, i);
-        printSection(sections[i], "  ");
+        if (segment.contains("summary"))
+            printImageSummary(segment["summary"]);
+        if (segment.contains("dataLength"))
+            std::printf("  data: %lld bytes at offset %lld\n", segment["dataLength"].get<long long>(),
+                        segment["dataOffset"].get<long long>());
+        for (const Json& kindName : segment.value("kinds", Json::array()))
+            std::printf("  %s\n", plain(kindName).c_str());
+        for (const Json& comment : segment.value("comments", Json::array()))
+            std::printf("  comment: %s\n", plain(comment).c_str());
+        printFields(segment["subheader"], "    ");
+        printTres(segment["tres"], "    ");
     }
 }
 
-void printText(const char* path, const FileInfo& info) {
+void printText(const Json& info) {
     static const char* const versions[] = {"NITF 1.1", "NITF 2.0", "NITF 2.1", "NITF 2.1",
                                            "NSIF 1.0", "OSDE",     "unknown"};
-    std::printf("File: %s\nVersion: %s (%s)\n", path, info.version.c_str(), versions[info.versionCode]);
+    int code = info["versionCode"].get<int>();
+    const Json& counts = info["segments"];
+    std::printf("File: %s\nVersion: %s (%s)\n", plain(info["file"]).c_str(), plain(info["version"]).c_str(),
+                versions[code >= 0 && code <= 6 ? code : 6]);
     std::printf("Segments: %d image, %d graphic, %d label, %d text, %d DES, %d RES\n\nFile header:\n",
-                info.counts[0], info.counts[1], info.counts[2], info.counts[3], info.counts[4],
-                info.counts[5]);
-    printSection(info.header, "");
-    printSegments("Image", info.images);
-    printSegments("Graphic", info.graphics);
-    printSegments("Label", info.labels);
-    printSegments("Text", info.texts);
-    printSegments("DES", info.des);
+                counts["image"].get<int>(), counts["graphic"].get<int>(), counts["label"].get<int>(),
+                counts["text"].get<int>(), counts["des"].get<int>(), counts["res"].get<int>());
+    printFields(info["header"], "  ");
+    printTres(info["tres"], "  ");
+    printSegments("Image", info["images"]);
+    printSegments("Graphic", info["graphics"]);
+    printSegments("Label", info["labels"]);
+    printSegments("Text", info["texts"]);
+    printSegments("DES", info["des"]);
 }
 
 } // namespace
 
 int runInfo(int argc, char** argv) {
-    bool json = false;
-    const char* path = nullptr;
-    for (int i = 0; i < argc; ++i) {
-        if (std::strcmp(argv[i], "--json") == 0)
-            json = true;
-        else
-            path = argv[i];
+    Settings settings;
+    cli::Options options(*cli::findCommand("info"),
+                         {{"json", no_argument, nullptr, 'j'}, {"tre", required_argument, nullptr, 't'}},
+                         "jt:");
+    int status = options.parse(argc, argv, [&](int code, const char* value) {
+        if (code == 'j')
+            settings.json = true;
+        else if (code == 't')
+            settings.tre = value;
+        return code == 'j' || code == 't';
+    });
+    if (status >= 0)
+        return status;
+    if (options.operands().empty())
+        return options.usageError("no file given");
+
+    Json all = Json::array();
+    int failures = 0;
+    for (const std::string& path : options.operands()) {
+        try {
+            Json info = describe(path, settings);
+            if (settings.json)
+                all.push_back(info);
+            else
+                printText(info);
+            if (!settings.json && &path != &options.operands().back())
+                std::printf("\n");
+        } catch (const vexo::Exception& e) {
+            cli::reportError("info", path, e.what());
+            ++failures;
+        } catch (const std::exception& e) {
+            cli::reportError("info", path, e.what());
+            ++failures;
+        }
     }
-    if (!path) {
-        std::fprintf(stderr, "usage: nitf info [--json] FILE\n");
-        return 2;
+    if (settings.json && !all.empty()) {
+        // One file gives its object, several an array of them.
+        const Json& document = options.operands().size() == 1 && all.size() == 1 ? all[0] : all;
+        std::printf("%s\n", document.dump(2, ' ', false, Json::error_handler_t::replace).c_str());
     }
-    try {
-        FileInfo info = collect(path);
-        if (json)
-            printJson(info);
-        else
-            printText(path, info);
-    } catch (const vexo::Exception& e) {
-        std::fprintf(stderr, "nitf: %s: %s\n", path, e.what());
-        return 1;
-    } catch (const std::exception& e) {
-        std::fprintf(stderr, "nitf: %s\n", e.what());
-        return 1;
-    }
-    return 0;
+    return failures ? 1 : 0;
 }

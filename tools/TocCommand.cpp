@@ -11,6 +11,7 @@
 #include <strings.h>
 #include <vector>
 
+#include "CommandLine.h"
 #include "Commands.h"
 #include "HostError.h"
 #include "HostFile.h"
@@ -175,18 +176,16 @@ Description describeRaw(const std::string& path) {
 
 int runToc(int argc, char** argv) {
     bool json = false;
-    std::vector<const char*> paths;
-    for (int i = 0; i < argc; ++i) {
-        if (std::strcmp(argv[i], "--json") == 0)
-            json = true;
-        else
-            paths.push_back(argv[i]);
-    }
-    if (paths.size() != 1) {
-        std::fprintf(stderr, "usage: nitf toc [--json] A.TOC|FRAME\n");
-        return 2;
-    }
-    const char* path = paths[0];
+    cli::Options options(*cli::findCommand("toc"), {{"json", no_argument, nullptr, 'j'}}, "j");
+    const int status = options.parse(argc, argv, [&](int code, const char*) {
+        json = code == 'j';
+        return json;
+    });
+    if (status >= 0)
+        return status;
+    if (options.operands().size() != 1)
+        return options.usageError("one A.TOC or frame file");
+    const std::string& path = options.operands().front();
     try {
         const Description description = startsWithNitf(path) ? describeNitf(path) : describeRaw(path);
         if (json) {
@@ -195,11 +194,8 @@ int runToc(int argc, char** argv) {
             for (const std::string& line : description.lines)
                 std::printf("%s\n", line.c_str());
         }
-    } catch (const vexo::Exception& e) {
-        std::fprintf(stderr, "nitf: %s: %s\n", path, e.what());
-        return 1;
     } catch (const std::exception& e) {
-        std::fprintf(stderr, "nitf: %s\n", e.what());
+        cli::reportError("toc", path, e.what());
         return 1;
     }
     return 0;

@@ -3,50 +3,41 @@
 #include <cstring>
 #include <string>
 
-#include "Commands.h"
+#include "CommandLine.h"
 #include "HostError.h"
 #include "NitfVersion.h"
 
-static int usage(FILE* out) {
-    std::fprintf(
-        out,
-        "usage: nitf --version\n"
-        "       nitf info [--json] FILE  describe the file's headers, segments and TREs\n"
-        "       nitf extract FILE [-i IMAGE] [-b BAND] -f raw|png|pgm -o OUT\n"
-        "                                decode an image (default 0) to canonical raw bytes or a picture\n"
-        "       nitf toc [--json] PATH   an RPF table of contents (A.TOC, raw or NITF) with its rectangles "
-        "and\n"
-        "                                frames, or the RPF description of a CADRG/CIB frame file\n"
-        "       nitf sample OUT.ntf      write a small demo NITF 2.1 file\n"
-        "       nitf selfcheck [DIR]     write fields to a file in DIR and read them back\n");
-    return out == stdout ? 0 : 2;
-}
-
 int main(int argc, char** argv) {
-    if (argc < 2)
-        return usage(stderr);
-    std::string command = argv[1];
-    try {
-        if (command == "--version" || command == "version") {
-            std::printf("nitf %s\n", nitfVersion());
+    if (argc < 2) {
+        cli::printOverview(stderr);
+        return 2;
+    }
+    std::string name = argv[1];
+    if (name == "--version" || name == "version") {
+        std::printf("nitf %s\n", nitfVersion());
+        return 0;
+    }
+    if (name == "--help" || name == "-h" || name == "help") {
+        cli::printOverview(stdout);
+        return 0;
+    }
+    const cli::Command* command = cli::findCommand(name);
+    if (!command) {
+        std::fprintf(stderr, "nitf: unknown command '%s'\n\n", name.c_str());
+        cli::printOverview(stderr);
+        return 2;
+    }
+    // Every command answers --help the same way, whatever its own parsing.
+    for (int i = 2; i < argc; ++i) {
+        if (std::strcmp(argv[i], "--help") == 0 || std::strcmp(argv[i], "-h") == 0) {
+            cli::printHelp(*command, stdout);
             return 0;
         }
-        if (command == "--help" || command == "help")
-            return usage(stdout);
-        if (command == "info")
-            return runInfo(argc - 2, argv + 2);
-        if (command == "sample")
-            return runSample(argc - 2, argv + 2);
-        if (command == "selfcheck")
-            return runSelfCheck(argc - 2, argv + 2);
-        if (command == "extract")
-            return runExtract(argc - 2, argv + 2);
-        if (command == "toc")
-            return runToc(argc - 2, argv + 2);
+    }
+    try {
+        return command->run(argc - 2, argv + 2);
     } catch (const vexo::Exception& e) {
-        std::fprintf(stderr, "nitf: %s\n", e.what());
+        std::fprintf(stderr, "nitf %s: %s\n", command->name, e.what());
         return 1;
     }
-    std::fprintf(stderr, "nitf: unknown command '%s'\n", command.c_str());
-    return usage(stderr);
 }

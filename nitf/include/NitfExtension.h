@@ -3,15 +3,15 @@
 
 #include <cstdio>
 #include <memory>
+#include <vector>
 
+#include "NitfField.h"
 #include "NitfProperty.h"
 
 class CNitfFile;
 class CNitfTag;
-namespace tre {
-class Layout;
-class KeyStore;
-} // namespace tre
+class CRecordLayout;
+class CKeyStore;
 
 class CNitfExtension {
 public:
@@ -42,6 +42,8 @@ public:
     // Copies the tag's data offset and length (for parsers constructed directly).
     void prepare(CNitfTag* tag);
     static bool isKnownExtension(const char* identifier);
+    // The identifiers Build makes parsers for, in the order it tries them.
+    static std::vector<const char*> getBuiltExtensionNames();
     // Appends every non-empty field to a host metadata list, in key order, under "P.NS.F", "P.N.F", "NS.F" or
     // "N.F" (P the prefix, N the TRE name, S the suffix, F the field key; null prefix or suffix leave theirs
     // out).
@@ -53,24 +55,27 @@ public:
     static unsigned __int64 getBinaryValue(CNitfProperty* field, int width);
 
     PropertyMap& getProperties() { return m_properties; }
+    // The fields the last read met, in file order (asMetadata gives them in key order instead).
+    const std::vector<NitfField_t>& getFields() const { return m_fields; }
     __int64 getDataOffset() const { return m_dataOffset; }
     __int64 getDataLength() const { return m_dataLength; }
     // Bytes the last read consumed from the TRE's data (equal to the data length for a well-formed TRE).
     __int64 getReadLength() const { return m_readLength; }
 
 protected:
-    // Reads the fields of `layout` at the stream's position (see tre::readLayout) and records the bytes
-    // consumed.
-    void readLayout(FILE* fp, const tre::Layout& layout, __int64 externalCount = 0);
+    // Reads the fields of `layout` at the stream's position (see CRecordLayout::read) and records the bytes
+    // consumed; the fields join those of earlier reads in the order met.
+    void readLayout(FILE* fp, const CRecordLayout& layout, __int64 externalCount = 0);
 
     __int64 m_dataOffset;
     __int64 m_dataLength;
     PropertyMap m_properties;
     __int64 m_readLength;
+    std::vector<NitfField_t> m_fields;
 
 private:
     // The key store of this extension, made its own first if it is shared with a copy.
-    tre::KeyStore& ownKeys();
+    CKeyStore& ownKeys();
 
-    std::shared_ptr<tre::KeyStore> m_keys;
+    std::shared_ptr<CKeyStore> m_keys;
 };

@@ -6,12 +6,14 @@
 #include <list>
 #include <vector>
 
+#include "NitfField.h"
 #include "NitfHeaderDataPair.h"
 #include "NitfProperty.h"
 #include "NitfTag.h"
 #include "NitfTypes.h"
 
 class CNitfFileReader;
+class CRecordLayout;
 class CNitfImageSubheader;
 
 class CNitfFileHeader {
@@ -40,8 +42,8 @@ public:
     std::list<CNitfTag*>& getTaggedRecords() { return m_taggedRecords; }
     bool getPropertiesModified() const { return m_propertiesModified; }
     void setPropertiesModified() { m_propertiesModified = true; }
-    // The names of the fields read, in file order.
-    const std::vector<const char*>& getFieldNames() const { return m_fieldNames; }
+    // The fields read, in file order (the segment tables by their count fields).
+    const std::vector<NitfField_t>& getFields() const { return m_fields; }
 
     int getImageCount() const { return static_cast<int>(m_images.size()); }
     int getSymbolCount() const { return static_cast<int>(m_symbols.size()); }
@@ -76,17 +78,24 @@ public:
     __int64 computeFileLength();
 
 protected:
-    // Reads a TRE area (UDHD or XHD): its 5-digit length (stored under `lengthName`), the 3-digit overflow
-    // field (skipped), then the TREs.
-    void readTagArea(FILE* fp, const char* lengthName);
+    // Reads the user-defined and extended header data: UDHDL and XHDL, then the TREs of each area (the
+    // overflow numbers are skipped).
+    void readTagAreas(FILE* fp);
     // Reads one counted field (NUMI, ...) as text and the segment table behind it; returns the segments'
     // total.
     __int64 readSegmentTable(FILE* fp, const char* countName, __int64 firstOffset, int headerLengthWidth,
                              int dataLengthWidth, std::vector<CNitfHeaderDataPair*>* list);
-    void recordField(const char* name) { m_fieldNames.push_back(name); }
+    void recordField(const char* name, int width, __int64 offset) {
+        m_fields.push_back({name, eFieldText, width, offset});
+    }
     // A new sub-header of type `Subheader` read from image `index`'s place, or null for an unknown index.
     template <typename Subheader> CNitfImageSubheader* readImageSubheader(FILE* fp, int index);
     void clearContents();
+    // Writes a header of image segments only: the fields of `head` (FHDR to HL, with FL and HL as they are
+    // now), the image table, then no other segments and no TREs (NUMS, the reserved count, NUMT, NUMDES and
+    // NUMRES "000", UDHDL and XHDL "00000").
+    void writeImagesOnly(FILE* fp, const CRecordLayout& head);
+    __int64 imagesOnlyLength(const CRecordLayout& head);
 
     std::vector<CNitfHeaderDataPair*> m_symbols;
     std::vector<CNitfHeaderDataPair*> m_images;
@@ -98,7 +107,7 @@ protected:
     std::list<CNitfTag*> m_taggedRecords;
     eNitfVersion_t m_version;
     bool m_propertiesModified;
-    std::vector<const char*> m_fieldNames;
+    std::vector<NitfField_t> m_fields;
 
 private:
     void seekToImageSubheader(FILE* fp, int index);

@@ -3,12 +3,12 @@
 #pragma once
 
 #include <cstdio>
-#include <initializer_list>
-#include <utility>
 #include <list>
+#include <memory>
 #include <vector>
 
 #include "DataPointer.h"
+#include "NitfField.h"
 #include "NitfGeorefInfo.h"
 #include "NitfLutSource.h"
 #include "NitfProperty.h"
@@ -20,6 +20,8 @@ class CMAPLOBExtension;
 class CRPFIMGExtension;
 class CRpcSource;
 class CNitfFile;
+class CKeyStore;
+class CRecordLayout;
 
 class CNitfImageSubheader {
 public:
@@ -48,8 +50,8 @@ public:
     CNitfLutSource* addNewLutSource();
     void setPropertiesModified() { m_propertiesModified = true; }
     bool getPropertiesModified() const { return m_propertiesModified; }
-    // The names of the fields read, in file order.
-    const std::vector<const char*>& getFieldNames() const { return m_fieldNames; }
+    // The fields read, in file order.
+    const std::vector<NitfField_t>& getFields() const;
 
     // The integer value of "LALVL" (an empty field is created when absent, so this is 0 for files read).
     int getImageAttachment();
@@ -78,32 +80,23 @@ public:
 
 protected:
     bool hasTag(const char* name) { return CNitfTag::find(name, m_taggedRecords) != nullptr; }
-    // A band field name owned by this sub-header.
-    const char* ownBandFieldName(const char* name, int index, int count);
     void clearContents();
 
-    // Reads the fields from ENCRYP to the end, common to every version; `rules` says where versions differ.
-    struct BodyRules {
-        eNitfVersion_t version;
-        bool comratForAllCompressed; // NITF 2.0: COMRAT for every IC but NC/NM (2.1: a closed list)
-        bool hasXbands;
-        bool hasTagAreas;
-    };
-    void readBody(FILE* fp, const BodyRules& rules);
-    void readField(FILE* fp, const char* name, int width);
-    void readBand(FILE* fp, int band, int count, int representation);
-    void readTagArea(FILE* fp, const char* lengthName);
-
-    // Writes the fields from ENCRYP to the end in the 2.1 layout (shared by the 2.0 writer, whose fields
-    // there are the same), and the length that produces on top of `fixedLength` (the fields up to IC, without
-    // IGEOLO).
-    void writeBody(FILE* fp);
-    __int64 computeBodyStorageLength(__int64 fixedLength);
+    // The layout a version's sub-header is read with, and the one this class writes.
+    virtual const CRecordLayout& readLayout(eNitfVersion_t version) const = 0;
+    virtual const CRecordLayout& writeLayout() const = 0;
+    // Reads the sub-header with the layout of `version`, then what its fields point at: comments, look-up
+    // tables, corners and TREs.
+    void readWith(FILE* fp, eNitfVersion_t version);
+    // Writes the sub-header in this class's layout with the values that writing computes (see
+    // writtenValues), and places the look-up table, the corners and the TREs; returns the bytes written.
+    __int64 writeWithLayout(FILE* fp);
+    // The bytes writeWithLayout produces, plus the extended area of a sub-header read from a file (IXSHDL is
+    // still counted, although it is written as "00000").
+    __int64 storageLength();
     // The title: the classification word unless unclassified, then the text of `nameField`; cut to 80
     // characters.
     void buildTitle(const char* nameField, char* title);
-    // Writes the named fields from the map in their widths; a field with no value writes nothing.
-    void writeFields(FILE* fp, std::initializer_list<std::pair<const char*, int>> fields);
 
     std::vector<CDataPointer*> m_comments;
     std::vector<CNitfLutSource*> m_luts;
@@ -111,6 +104,15 @@ protected:
     std::list<CNitfTag*> m_taggedRecords;
     PropertyMap m_properties;
     bool m_propertiesModified;
-    std::vector<const char*> m_fieldNames;
-    std::vector<char*> m_ownedNames;
+    std::unique_ptr<CKeyStore> m_keys; // the keys of the band fields
+    // Where the sub-header was read: its fields are listed from there when first asked for.
+    const CRecordLayout* m_readLayout = nullptr;
+    __int64 m_readOffset = 0;
+    mutable std::vector<NitfField_t> m_fields;
+    mutable bool m_fieldsListed = false;
+
+private:
+    // The values that writing computes rather than takes from the map: IREP, NICOM, IFCn, IMFLTn, the look-up
+    // table fields, UDIDL, UDOFL and IXSHDL.
+    void writtenValues(PropertyMap& values, CKeyStore& keys);
 };

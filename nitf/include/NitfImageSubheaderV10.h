@@ -5,9 +5,6 @@
 #include "NitfImageSubheaderV20.h"
 
 class CNitfImageSubheaderV10 : public CNitfImageSubheaderV20 {
-public:
-    void read(FILE* fp, eNitfVersion_t version) override;
-
 protected:
-    const class CFieldLayout& headLayout() const override;
+    const CRecordLayout& readLayout(eNitfVersion_t version) const override;
 };

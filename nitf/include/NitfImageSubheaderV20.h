@@ -16,6 +16,6 @@ public:
     void getTitle(char* title) override;
 
 protected:
-    // The fields from IM to the security group's end.
-    virtual const class CFieldLayout& headLayout() const;
+    const CRecordLayout& readLayout(eNitfVersion_t version) const override;
+    const CRecordLayout& writeLayout() const override;
 };

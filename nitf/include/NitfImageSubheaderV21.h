@@ -14,4 +14,8 @@ public:
     void write(FILE* fp) override;
     __int64 computeStorageLength() override;
     void getTitle(char* title) override;
+
+protected:
+    const CRecordLayout& readLayout(eNitfVersion_t version) const override;
+    const CRecordLayout& writeLayout() const override;
 };

@@ -32,6 +32,10 @@ public:
     CNitfProperty& operator=(const CNitfProperty& other);
     CNitfProperty(const CNitfProperty& other);
 
+    // Values come from pooled storage: a file's headers hold thousands of them.
+    static void* operator new(size_t size);
+    static void operator delete(void* object);
+
     // Readers: each releases the old value first. Binary values are big-endian in the file.
     void readString(FILE* fp, int length);
     void readChars(FILE* fp, int length);
@@ -59,10 +63,19 @@ public:
     // Raw bytes (eChars) copied from `bytes`.
     void setChars(const char* bytes, int length);
     void setInt4(int value);
+    void setUint1(int value);
+    void setUint2(int value);
+    void setFloat(float value);
+    void setDouble(double value);
 
     eDataType getDataType() const { return m_type; }
     // The owned buffer of an eString or eChars value (null for other kinds); getLength() tells its size.
     const char* getBytes() const { return m_type == eString || m_type == eChars ? m_value.text : nullptr; }
+    // The bytes an eString or eChars value holds as it was set or read, NULs included (getLength() of an
+    // eString stops at its first NUL); 0 for other kinds.
+    size_t getStoredLength() const {
+        return m_type == eString || m_type == eChars ? static_cast<size_t>(m_count) : 0;
+    }
     float getFloat() const { return m_value.f; }
     double getDouble() const { return m_value.d; }
 
@@ -95,7 +108,8 @@ public:
 private:
     void baseConstruct();
     void release();
-    char* allocateBuffer(int length, FILE* fp);
+    // A new buffer of `length` bytes read from the stream (zeros where the file ends) and a NUL.
+    static char* allocateBuffer(int length, FILE* fp);
 
     union Value {
         char* text;

@@ -4,14 +4,20 @@
 
 #include <cstdio>
 #include <list>
+#include <utility>
 #include <vector>
 
+#include "NitfField.h"
 #include "NitfHeaderDataPair.h"
 #include "NitfProperty.h"
 #include "NitfTag.h"
 #include "NitfTypes.h"
 
 class CNitfFile;
+class CRecordLayout;
+namespace record {
+struct Report;
+}
 
 class CNitfSegmentSource {
 public:
@@ -25,8 +31,8 @@ public:
 
     PropertyMap& getProperties() { return m_properties; }
     std::list<CNitfTag*>& getTaggedRecords() { return m_taggedRecords; }
-    // The names of the fields read, in file order.
-    const std::vector<const char*>& getFieldNames() const { return m_fieldNames; }
+    // The fields read, in file order.
+    const std::vector<NitfField_t>& getFields() const;
     // The text of a field with trailing blanks removed, or "" when absent.
     std::string getField(const char* name);
 
@@ -43,9 +49,12 @@ public:
 protected:
     // Seeks the stream to the sub-header (when `fp` is null, the file's own stream) and returns it.
     FILE* positionAtSubheader(CNitfFile* file, FILE* fp);
-    // Reads a TRE area: its 5-digit length (stored under `lengthName`), then when not 0 the overflow number
-    // (skipped) and the TREs, numbered in this segment's list.
-    void readTagArea(FILE* fp, const char* lengthName, CNitfTag::eTagSource_t source);
+    // Reads the fields of `layout` at the stream's position, then the TREs of its area named `area` (when
+    // given) into this segment's list with `source`.
+    void readFields(FILE* fp, const CRecordLayout& layout, const char* area = nullptr,
+                    CNitfTag::eTagSource_t source = CNitfTag::eTagSourceUnknown);
+    // Reads one part of the sub-header at the stream's position (the parts follow each other).
+    void readPart(FILE* fp, const CRecordLayout& layout, const record::Report& report);
     void clearContents();
 
     __int64 m_subheaderOffset;
@@ -54,5 +63,8 @@ protected:
     int m_index;
     PropertyMap m_properties;
     std::list<CNitfTag*> m_taggedRecords;
-    std::vector<const char*> m_fieldNames;
+    // Where the parts of the sub-header were read: the fields are listed from there when first asked for.
+    std::vector<std::pair<const CRecordLayout*, __int64>> m_parts;
+    mutable std::vector<NitfField_t> m_fields;
+    mutable bool m_fieldsListed = false;
 };

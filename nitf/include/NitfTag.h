@@ -41,6 +41,9 @@ public:
 
     // Reads the 11-byte TRE header at the stream's position and skips the data; returns the bytes consumed.
     long long read(FILE* fp);
+    // The same from the 11 bytes at `header`, whose data begins at the file offset `dataOffset`; returns the
+    // bytes the TRE takes.
+    long long read(const char* header, long long dataOffset);
     // Writes the 11-byte TRE header and skips the data (the caller puts it there); returns the bytes
     // accounted for.
     long long write(FILE* fp);
@@ -75,6 +78,10 @@ public:
     // consumed.
     static long long readArea(FILE* fp, long long length, eTagSource_t source, std::list<CNitfTag*>& list,
                               bool number);
+    // The same over an area already in memory that begins at the file offset `offset`: a TRE header cut by
+    // the area's end ends the walk.
+    static long long readArea(const char* area, long long length, long long offset, eTagSource_t source,
+                              std::list<CNitfTag*>& list, bool number);
     // Deletes every entry and empties the list.
     static void destroyList(std::list<CNitfTag*>& list);
 

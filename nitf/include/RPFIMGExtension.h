@@ -20,5 +20,5 @@ public:
 private:
     // Reads `count` records of a subsection at the absolute position `at`; the read length stays that of the
     // subsection's header when there are none.
-    void readRecords(FILE* fp, __int64 at, const tre::Layout& records, __int64 count);
+    void readRecords(FILE* fp, __int64 at, const CRecordLayout& records, __int64 count);
 };

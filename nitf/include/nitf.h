@@ -40,6 +40,7 @@
 #include "NBLOCAExtension.h"
 #include "NitfDataExtensionSource.h"
 #include "NitfExtension.h"
+#include "NitfField.h"
 #include "NitfFile.h"
 #include "NitfFileHeader.h"
 #include "NitfFileHeaderV11.h"

@@ -4,7 +4,8 @@
 #include <string>
 
 #include "DataStream.h"
-#include "FieldLayout.h"
+#include "RecordLayout.h"
+#include "SecurityFields.h"
 #include "HostFile.h"
 #include "HostMemory.h"
 #include "NitfFile.h"
@@ -12,25 +13,95 @@
 #include "NitfImageSource.h"
 #include "NitfSymbolSource.h"
 
-// Identifiers are compared in their stored, blank-padded form.
-static std::string padded(const char* text, size_t width) {
-    std::string value(text);
-    value.resize(width, ' ');
-    return value;
+// Identifiers are compared in their stored form, blank-padded to 25 characters, ignoring case.
+static bool identifierIs(const char* bytes, size_t length, const char* word) {
+    size_t n = std::strlen(word);
+    if (length != 25 || _strnicmp(bytes, word, n) != 0)
+        return false;
+    for (size_t i = n; i < 25; ++i) {
+        if (bytes[i] != ' ')
+            return false;
+    }
+    return true;
 }
 
-static bool fieldEquals(PropertyMap& map, const char* name, const char* value, size_t width) {
+static bool isOverflow20(const char* tag, size_t length) {
+    return identifierIs(tag, length, "Registered Extensions") ||
+           identifierIs(tag, length, "Controlled Extensions");
+}
+static bool isOverflow21(const char* id, size_t length) {
+    return identifierIs(id, length, "TRE_OVERFLOW");
+}
+static bool isCloudShape(const char* id, size_t length) {
+    return identifierIs(id, length, "CSSHPA DES");
+}
+static bool isNotCloudShape(const char* id, size_t length) {
+    return !isCloudShape(id, length);
+}
+static bool isStreaming(const char* id, size_t length) {
+    return identifierIs(id, length, "STREAMING_FILE_HEADER");
+}
+
+// Whether the identifier field read holds that kind.
+static bool fieldIs(PropertyMap& map, const char* name, bool (*kind)(const char*, size_t)) {
     CNitfProperty* field = FindProperty(map, name);
     return field && field->getDataType() == CNitfProperty::eString &&
-           _stricmp(field->getAsString(), padded(value, width).c_str()) == 0;
+           kind(field->getBytes(), field->getStoredLength());
 }
 
-static const CFieldLayout& securityLayout(eNitfVersion_t version) {
-    static const CFieldLayout none;
+using namespace record;
+
+static Part part(const std::vector<Entry>& entries) {
+    return Part(entries.data(), entries.size());
+}
+
+// clang-format off
+static const Entry kHead20[] = {Text("DE", 2), Text("DESTAG", 25), Text("DESVER", 2)};
+static const Entry kHead21[] = {Text("DE", 2), Text("DESID", 25), Text("DESVER", 2)};
+static const Entry kOsdeSecurity[] = {Text("DESSEC", 167)};
+// The kinds follow the identifier: overflow segments name the area and item they overflowed from, cloud
+// shapes carry their shape fields where other segments carry user-defined fields.
+static const Entry kBody20[] = {
+    IfCall("DESTAG", isOverflow20),
+        Text("DESOFLW", 6), Text("DESITEM", 3),
+    End(),
+    Text("DESSHL", 4),
+    IfNotZero("DESSHL"),
+        TextSizedBy("DESSHF", "DESSHL"),
+    End(),
+};
+static const Entry kBody21[] = {
+    IfCall("DESID", isOverflow21),
+        Text("DESOFLW", 6), Text("DESITEM", 3),
+    End(),
+    Text("DESSHL", 4),
+    IfCall("DESID", isCloudShape),
+        Text("SHAPE_USE", 25),
+        Text("SHAPE_CLASS", 10),
+        IfTextIgnoringCase("SHAPE_USE", "CLOUD_SHAPES             "),
+            Text("CC_SOURCE", 18),
+        End(),
+        Text("SHAPE1_NAME", 3), Text("SHAPE1_START", 6),
+        Text("SHAPE2_NAME", 3), Text("SHAPE2_START", 6),
+        Text("SHAPE3_NAME", 3), Text("SHAPE3_START", 6),
+    End(),
+    IfCall("DESID", isNotCloudShape),
+        IfNotZero("DESSHL"),
+            TextSizedBy("DESSHF", "DESSHL"),
+        End(),
+    End(),
+};
+static const Entry kStreamingLead[] = {Text("SFH_L1", 7), Unsigned("SFH_DELIM1", 4, kTyped)};
+static const Entry kStreamingTrail[] = {Unsigned("SFH_DELIM2", 4, kTyped), Text("SFH_L2", 7)};
+// clang-format on
+
+// DE, DESID (DESTAG in NITF 2.0), DESVER, the security group of the version, and the fields of the kind.
+static const CRecordLayout& layoutOf(eNitfVersion_t version) {
     // The 2.0 control-and-handling field is kept as "DECTLH"; callers look it up by that name.
-    static const CFieldLayout nitf20 = CFieldLayout::security20("DES", "DECTLH");
-    static const CFieldLayout nitf21 = CFieldLayout::security21("DES");
-    static const CFieldLayout osde{{"DESSEC", 167}};
+    static const CRecordLayout nitf20({kHead20, part(securityFields20("DES", "DECTLH")), kBody20});
+    static const CRecordLayout nitf21({kHead21, part(securityFields21("DES")), kBody21});
+    static const CRecordLayout osde({kHead21, kOsdeSecurity, kBody21});
+    static const CRecordLayout other({kHead21, kBody21});
     switch (version) {
     case eNitfVersion20:
         return nitf20;
@@ -41,23 +112,8 @@ static const CFieldLayout& securityLayout(eNitfVersion_t version) {
     case eOsdeVersion01:
         return osde;
     default:
-        return none;
+        return other;
     }
-}
-
-static const CFieldLayout& cloudShapeLayout() {
-    static const CFieldLayout layout{
-        {"SHAPE_USE", 25},
-        {"SHAPE_CLASS", 10},
-        {"CC_SOURCE", 18, FieldForm::Text, whenEquals("SHAPE_USE", "CLOUD_SHAPES             ")},
-        {"SHAPE1_NAME", 3},
-        {"SHAPE1_START", 6},
-        {"SHAPE2_NAME", 3},
-        {"SHAPE2_START", 6},
-        {"SHAPE3_NAME", 3},
-        {"SHAPE3_START", 6},
-    };
-    return layout;
 }
 
 void CNitfDataExtensionSource::constructor() {
@@ -79,33 +135,15 @@ void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FIL
     constructor();
     fp = positionAtSubheader(file, fp);
 
-    static const CFieldLayout head20{{"DE", 2}, {"DESTAG", 25}, {"DESVER", 2}};
-    static const CFieldLayout head21{{"DE", 2}, {"DESID", 25}, {"DESVER", 2}};
-    static const CFieldLayout overflow{{"DESOFLW", 6}, {"DESITEM", 3}};
-    static const CFieldLayout userFields{{"DESSHL", 4},
-                                         {"DESSHF", 0, FieldForm::Text, whenNotZero("DESSHL"), "DESSHL"}};
-    static const CFieldLayout shapeLength{{"DESSHL", 4}};
-
+    readPart(fp, layoutOf(version), {});
     if (version == eNitfVersion20) {
-        head20.read(fp, m_properties, &m_fieldNames);
-        m_overflow = fieldEquals(m_properties, "DESTAG", "Registered Extensions", 25) ||
-                     fieldEquals(m_properties, "DESTAG", "Controlled Extensions", 25);
+        m_overflow = fieldIs(m_properties, "DESTAG", isOverflow20);
     } else {
-        head21.read(fp, m_properties, &m_fieldNames);
-        m_streaming = fieldEquals(m_properties, "DESID", "STREAMING_FILE_HEADER", 25);
-        m_overflow = fieldEquals(m_properties, "DESID", "TRE_OVERFLOW", 25);
-        m_cloudShape = fieldEquals(m_properties, "DESID", "CSSHPA DES", 25);
+        m_streaming = fieldIs(m_properties, "DESID", isStreaming);
+        m_overflow = fieldIs(m_properties, "DESID", isOverflow21);
+        m_cloudShape = fieldIs(m_properties, "DESID", ::isCloudShape);
     }
-    securityLayout(version).read(fp, m_properties, &m_fieldNames);
     // DESITEM names the overflowed segment; the TREs are attached by area, not by item.
-    if (m_overflow)
-        overflow.read(fp, m_properties, &m_fieldNames);
-    if (m_cloudShape) {
-        shapeLength.read(fp, m_properties, &m_fieldNames);
-        cloudShapeLayout().read(fp, m_properties, &m_fieldNames);
-    } else {
-        userFields.read(fp, m_properties, &m_fieldNames);
-    }
 
     if (m_streaming) {
         readStreamingHeader(fp);
@@ -116,17 +154,20 @@ void CNitfDataExtensionSource::read(CNitfFile* file, eNitfVersion_t version, FIL
 }
 
 void CNitfDataExtensionSource::readStreamingHeader(FILE* fp) {
-    static const CFieldLayout lead{{"SFH_L1", 7}, {"SFH_DELIM1", 4, FieldForm::Binary4}};
-    static const CFieldLayout trail{{"SFH_DELIM2", 4, FieldForm::Binary4}, {"SFH_L2", 7}};
-    lead.read(fp, m_properties, &m_fieldNames);
-    int length = FindProperty(m_properties, "SFH_L1")->getAsInt();
+    static const CRecordLayout lead(kStreamingLead);
+    static const CRecordLayout trail(kStreamingTrail);
+    readPart(fp, lead, {});
+    CNitfProperty* declared = FindProperty(m_properties, "SFH_L1");
+    if (!declared)
+        return; // the file ends before the streaming header
+    int length = declared->getAsInt();
     if (length < 0)
         length = 0;
     CDataStream::requireReadable(fp, length, "A streaming file header");
     m_streamingHeaderLength = length;
     m_streamingHeader = static_cast<char*>(HMalloc(length > 0 ? length : 1));
     CDataStream::readZeroFilled(fp, m_streamingHeader, static_cast<size_t>(length));
-    trail.read(fp, m_properties, &m_fieldNames);
+    readPart(fp, trail, {});
     // Leave the stream at the first byte of the replacement header.
     DKFSeek64(fp, -(11 + static_cast<__int64>(length)), SEEK_CUR);
 }
@@ -137,7 +178,13 @@ void CNitfDataExtensionSource::readOverflowTags(CNitfFile* file, FILE* fp, CNitf
     std::list<CNitfTag*>* target = header ? &header->getTaggedRecords() : nullptr;
     CNitfTag::eTagSource_t source = CNitfTag::eTagSourceUnknown;
 
-    auto area = [&](const char* name) { return fieldEquals(m_properties, "DESOFLW", name, 6); };
+    auto area = [&](const char* name) {
+        CNitfProperty* field = FindProperty(m_properties, "DESOFLW");
+        char padded[7];
+        std::snprintf(padded, sizeof padded, "%-6s", name);
+        return field && field->getDataType() == CNitfProperty::eString &&
+               _stricmp(field->getAsString(), padded) == 0;
+    };
     if (area("XHD") || area("UDHD")) {
         source = CNitfTag::eTagSourceFileHeaderDES;
     } else if (area("IXSHD") || area("UDID")) {

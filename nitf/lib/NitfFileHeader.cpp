@@ -5,6 +5,8 @@
 #include "DataStreamRead.h"
 #include "DataStreamWrite.h"
 #include "HostFile.h"
+#include "RecordLayout.h"
+#include "TagAreas.h"
 
 CNitfFileHeader::CNitfFileHeader(eNitfVersion_t version) : m_version(version), m_propertiesModified(false) {}
 
@@ -21,7 +23,7 @@ void CNitfFileHeader::clearContents() {
     }
     DestroyPropertyMap(m_properties);
     CNitfTag::destroyList(m_taggedRecords);
-    m_fieldNames.clear();
+    m_fields.clear();
 }
 
 eNitfVersion_t CNitfFileHeader::readVersion(FILE* fp) {
@@ -72,6 +74,34 @@ void CNitfFileHeader::writePairs(FILE* fp, int countWidth, int headerLengthWidth
     }
 }
 
+// NUMS, the reserved count (or NUML), NUMT, NUMDES, NUMRES, UDHDL and XHDL of a written header.
+static const char kWrittenTail[] = "000000000000000"
+                                   "00000"
+                                   "00000";
+
+void CNitfFileHeader::writeImagesOnly(FILE* fp, const CRecordLayout& head) {
+    PropertyMap lengths;
+    char text[32];
+    std::snprintf(text, sizeof text, "%012lld", static_cast<long long>(computeFileLength()));
+    SetProperty(lengths, "FL", new CNitfProperty(text));
+    std::snprintf(text, sizeof text, "%06lld", static_cast<long long>(computeStorageLength()));
+    SetProperty(lengths, "HL", new CNitfProperty(text));
+    try {
+        head.write(fp, m_properties, &lengths);
+    } catch (...) {
+        DestroyPropertyMap(lengths);
+        throw;
+    }
+    DestroyPropertyMap(lengths);
+    writePairs(fp, 3, 6, 10, &m_images);
+    CDataStreamWrite(fp).writeBytes(kWrittenTail, sizeof kWrittenTail - 1);
+}
+
+__int64 CNitfFileHeader::imagesOnlyLength(const CRecordLayout& head) {
+    return head.length(m_properties) + 3 + 16 * static_cast<__int64>(m_images.size()) +
+           static_cast<__int64>(sizeof kWrittenTail - 1);
+}
+
 __int64 CNitfFileHeader::computeFileLength() {
     return computeStorageLength() + CNitfHeaderDataPair::computeVectorLengths(&m_images);
 }
@@ -79,24 +109,39 @@ __int64 CNitfFileHeader::computeFileLength() {
 __int64 CNitfFileHeader::readSegmentTable(FILE* fp, const char* countName, __int64 firstOffset,
                                           int headerLengthWidth, int dataLengthWidth,
                                           std::vector<CNitfHeaderDataPair*>* list) {
+    recordField(countName, 3, DKFTell(fp));
     SetProperty(m_properties, countName, CNitfProperty::getNewFromString(fp, 3));
-    recordField(countName);
     DKFSeek64(fp, -3, SEEK_CUR);
     __int64 fieldBytes = 0;
     int count = 0;
     return readPairs(fp, firstOffset, 3, headerLengthWidth, dataLengthWidth, list, fieldBytes, count);
 }
 
-void CNitfFileHeader::readTagArea(FILE* fp, const char* lengthName) {
-    CNitfProperty* lengthField = CNitfProperty::getNewFromString(fp, 5);
-    SetProperty(m_properties, lengthName, lengthField);
-    recordField(lengthName);
-    int length = lengthField->getAsInt();
-    if (length <= 0)
-        return;
-    // The overflow number is not kept: the overflow is resolved when its data extension segment is read.
-    DKFSeek64(fp, 3, SEEK_CUR);
-    CNitfTag::readArea(fp, length - 3, CNitfTag::eTagSourceFileHeader, m_taggedRecords, true);
+void CNitfFileHeader::readTagAreas(FILE* fp) {
+    using namespace record;
+    // clang-format off
+    static const Entry kAreas[] = {
+        Text("UDHDL", 5),
+        IfNotZero("UDHDL"),
+            Place("UDHOFL", 3),
+            TagArea("UDHD", "UDHDL"),
+        End(),
+        Text("XHDL", 5),
+        IfNotZero("XHDL"),
+            Place("XHDLOFL", 3),
+            TagArea("XHD", "XHDL"),
+        End(),
+    };
+    // clang-format on
+    static const CRecordLayout layout(kAreas);
+    std::vector<Placed> places;
+    Report report;
+    report.fields = &m_fields;
+    report.places = &places;
+    CKeyStore keys;
+    layout.read(fp, m_properties, keys, report);
+    // The overflow numbers are not kept: an overflow is resolved when its data extension segment is read.
+    ::readTagAreas(places, {"UDHD", "XHD"}, CNitfTag::eTagSourceFileHeader, m_taggedRecords);
 }
 
 void CNitfFileHeader::seekToImageSubheader(FILE* fp, int index) {

@@ -4,57 +4,60 @@
 #include <string>
 
 #include "DataStreamWrite.h"
-#include "FieldLayout.h"
+#include "RecordLayout.h"
+#include "Raise.h"
+#include "SecurityFields.h"
+
+static const char kSourceFile[] = "nitf/lib/NitfFileHeaderV20";
 #include "HostFile.h"
 #include "NitfImageSubheaderV20.h"
 
+using namespace record;
+
 // From FHDR to HL.
-static const CFieldLayout& fieldLayout() {
-    static const CFieldLayout layout =
-        CFieldLayout{{"FHDR", 9}, {"CLEVEL", 2}, {"STYPE", 4}, {"OSTAID", 10}, {"FDT", 14}, {"FTITLE", 80}}
-            .add(CFieldLayout::security20("FS"))
-            .add(CFieldLayout{{"FSCOP", 5}, {"FSCPYS", 5}, {"ENCRYP", 1}, {"ONAME", 27}, {"OPHONE", 18}})
-            .add(CFieldLayout{{"FL", 12}, {"HL", 6}});
+static const CRecordLayout& headLayout() {
+    // clang-format off
+    static const Entry kIdentity[] = {
+        Text("FHDR", 9), Text("CLEVEL", 2), Text("STYPE", 4), Text("OSTAID", 10), Text("FDT", 14),
+        Text("FTITLE", 80),
+    };
+    static const Entry kTail[] = {
+        Text("FSCOP", 5), Text("FSCPYS", 5), Text("ENCRYP", 1), Text("ONAME", 27), Text("OPHONE", 18),
+        Text("FL", 12), Text("HL", 6),
+    };
+    // clang-format on
+    const std::vector<Entry>& security = securityFields20("FS");
+    static const CRecordLayout layout({kIdentity, Part(security.data(), security.size()), kTail});
     return layout;
 }
 
 void CNitfFileHeaderV20::read(FILE* fp, CNitfFileReader*) {
     clearContents();
-    fieldLayout().read(fp, m_properties, &m_fieldNames);
-    __int64 offset = FindProperty(m_properties, "HL")->getAsInt64();
+    Report report;
+    report.fields = &m_fields;
+    CKeyStore keys;
+    headLayout().read(fp, m_properties, keys, report);
+    CNitfProperty* headerLength = FindProperty(m_properties, "HL");
+    if (!headerLength)
+        NITF_RAISE("The file header is cut short by the end of the file",
+                   "void __cdecl CNitfFileHeaderV20::read(" NITF_FILE_SIG ",class CNitfFileReader *)");
+    __int64 offset = headerLength->getAsInt64();
     offset += readSegmentTable(fp, "NUMI", offset, 6, 10, &m_images);
     offset += readSegmentTable(fp, "NUMS", offset, 4, 6, &m_symbols);
     offset += readSegmentTable(fp, "NUML", offset, 4, 3, &m_labels);
     offset += readSegmentTable(fp, "NUMT", offset, 4, 5, &m_texts);
     offset += readSegmentTable(fp, "NUMDES", offset, 4, 9, &m_dataExtensions);
     offset += readSegmentTable(fp, "NUMRES", offset, 4, 7, &m_reservedExtensions);
-    readTagArea(fp, "UDHDL");
-    readTagArea(fp, "XHDL");
+    readTagAreas(fp);
     m_propertiesModified = false;
 }
 
-// NUMS, NUML, NUMT, NUMDES, NUMRES, UDHDL and XHDL of a written header: images only, no TREs.
-static const char kWrittenTail[] = "000000000000000"
-                                   "00000"
-                                   "00000";
-
 void CNitfFileHeaderV20::write(FILE* fp) {
-    CFieldLayout head;
-    for (const FieldSpec& field : fieldLayout().fields()) {
-        if (std::strcmp(field.name, "FL") != 0 && std::strcmp(field.name, "HL") != 0)
-            head.add(field);
-    }
-    head.write(fp, m_properties);
-    CDataStreamWrite out(fp);
-    out.writeDecimal64(computeFileLength(), 12, true);
-    out.writeDecimal64(computeStorageLength(), 6, true);
-    writePairs(fp, 3, 6, 10, &m_images);
-    out.writeBytes(kWrittenTail, sizeof kWrittenTail - 1);
+    writeImagesOnly(fp, headLayout());
 }
 
 __int64 CNitfFileHeaderV20::computeStorageLength() {
-    return fieldLayout().length(m_properties) + 3 + 16 * static_cast<__int64>(m_images.size()) +
-           static_cast<__int64>(sizeof kWrittenTail - 1);
+    return imagesOnlyLength(headLayout());
 }
 
 void CNitfFileHeaderV20::getTitle(char* title) {

@@ -5,7 +5,8 @@
 
 #include "DataStreamRead.h"
 #include "DataStreamWrite.h"
-#include "FieldLayout.h"
+#include "RecordLayout.h"
+#include "SecurityFields.h"
 #include "HostFile.h"
 #include "NitfImageSubheaderV21.h"
 #include "Raise.h"
@@ -14,51 +15,58 @@ static const char kSourceFile[] = "nitf/lib/NitfFileHeaderV21";
 static const char kReadSignature[] =
     "void __cdecl CNitfFileHeaderV21::read(" NITF_FILE_SIG ",class CNitfFileReader *)";
 
-// From FHDR to ENCRYP: the same for every member of the family.
-static const CFieldLayout& identityLayout() {
-    static const CFieldLayout layout =
-        CFieldLayout{
-            {"FHDR", 9}, {"CLEVEL", 2}, {"STYPE", 4}, {"OSTAID", 10}, {"FDT", 14}, {"FTITLE", 80},
-        }
-            .add(CFieldLayout::security21("FS"))
-            .add({"FSCOP", 5})
-            .add({"FSCPYS", 5})
-            .add({"ENCRYP", 1});
-    return layout;
+using namespace record;
+
+static Part securityPart21() {
+    const std::vector<Entry>& fields = securityFields21("FS");
+    return Part(fields.data(), fields.size());
 }
 
-// The background colour and originator, or OSDE's single originator field of the same 45 bytes.
-static const CFieldLayout& originatorLayout(eNitfVersion_t version) {
-    static const CFieldLayout nitf{{"FBKGC", 3, FieldForm::Bytes}, {"ONAME", 24}, {"OPHONE", 18}};
-    static const CFieldLayout osde{{"OID", 45}};
+// clang-format off
+static const Entry kIdentity[] = {
+    Text("FHDR", 9), Text("CLEVEL", 2), Text("STYPE", 4), Text("OSTAID", 10), Text("FDT", 14), Text("FTITLE", 80),
+};
+static const Entry kCopies[] = {
+    Text("FSCOP", 5), Text("FSCPYS", 5), Text("ENCRYP", 1),
+};
+// The background colour (three binary bytes) and originator, or OSDE's single originator field of the same
+// 45 bytes.
+static const Entry kOriginator[] = {
+    Bytes("FBKGC", 3, kTyped), Text("ONAME", 24), Text("OPHONE", 18),
+};
+static const Entry kOsdeOriginator[] = {
+    Text("OID", 45),
+};
+static const Entry kLengths[] = {
+    Text("FL", 12), Text("HL", 6),
+};
+// clang-format on
+
+// From FHDR to HL.
+static const CRecordLayout& headLayout(eNitfVersion_t version) {
+    static const CRecordLayout nitf({kIdentity, securityPart21(), kCopies, kOriginator, kLengths});
+    static const CRecordLayout osde({kIdentity, securityPart21(), kCopies, kOsdeOriginator, kLengths});
     return version == eOsdeVersion01 ? osde : nitf;
 }
-
-static const CFieldLayout& lengthLayout() {
-    static const CFieldLayout layout{{"FL", 12}, {"HL", 6}};
-    return layout;
-}
-
-// The fixed tail that follows the image table in a written header: NUMS, NUMX, NUMT, NUMDES, NUMRES, UDHDL,
-// XHDL.
-static const char kWrittenTail[] = "000000000000000"
-                                   "00000"
-                                   "00000";
 
 CNitfFileHeaderV21::CNitfFileHeaderV21(eNitfVersion_t version) : CNitfFileHeader(version) {}
 
 void CNitfFileHeaderV21::readFields(FILE* fp) {
-    identityLayout().read(fp, m_properties, &m_fieldNames);
-    originatorLayout(m_version).read(fp, m_properties, &m_fieldNames);
-    lengthLayout().read(fp, m_properties, &m_fieldNames);
+    Report report;
+    report.fields = &m_fields;
+    CKeyStore keys;
+    headLayout(m_version).read(fp, m_properties, keys, report);
+    CNitfProperty* headerLength = FindProperty(m_properties, "HL");
+    if (!headerLength)
+        NITF_RAISE("The file header is cut short by the end of the file", kReadSignature);
 
-    __int64 offset = FindProperty(m_properties, "HL")->getAsInt64();
+    __int64 offset = headerLength->getAsInt64();
     offset += readSegmentTable(fp, "NUMI", offset, 6, 10, &m_images);
     offset += readSegmentTable(fp, "NUMS", offset, 4, 6, &m_symbols);
 
+    recordField("NUMX", 3, DKFTell(fp));
     CNitfProperty* reserved = CNitfProperty::getNewFromString(fp, 3);
     SetProperty(m_properties, "NUMX", reserved);
-    recordField("NUMX");
     if (reserved->getAsInt() != 0) {
         // Nothing after a non-zero reserved count is trusted. Two conformance files are known to carry one;
         // the outcome is the same for them as for any other file.
@@ -71,8 +79,7 @@ void CNitfFileHeaderV21::readFields(FILE* fp) {
     offset += readSegmentTable(fp, "NUMT", offset, 4, 5, &m_texts);
     offset += readSegmentTable(fp, "NUMDES", offset, 4, 9, &m_dataExtensions);
     offset += readSegmentTable(fp, "NUMRES", offset, 4, 7, &m_reservedExtensions);
-    readTagArea(fp, "UDHDL");
-    readTagArea(fp, "XHDL");
+    readTagAreas(fp);
 }
 
 void CNitfFileHeaderV21::read(FILE* fp, CNitfFileReader*) {
@@ -133,31 +140,11 @@ __int64 CNitfFileHeaderV21::findStreamingHeader(FILE* fp) {
 }
 
 void CNitfFileHeaderV21::write(FILE* fp) {
-    identityLayout().write(fp, m_properties);
-    CDataStreamWrite out(fp);
-    if (m_version == eOsdeVersion01) {
-        originatorLayout(m_version).write(fp, m_properties);
-    } else {
-        unsigned int red = 0, green = 0, blue = 0;
-        CNitfProperty* colour = FindProperty(m_properties, "FBKGC");
-        if (colour && colour->getDataType() != CNitfProperty::eNone)
-            std::sscanf(colour->toText().c_str(), "%2x%2x%2x", &red, &green, &blue);
-        out.writeByte(static_cast<unsigned char>(red));
-        out.writeByte(static_cast<unsigned char>(green));
-        out.writeByte(static_cast<unsigned char>(blue));
-        CFieldLayout{{"ONAME", 24}, {"OPHONE", 18}}.write(fp, m_properties);
-    }
-    out.writeDecimal64(computeFileLength(), 12, true);
-    out.writeDecimal64(computeStorageLength(), 6, true);
-    writePairs(fp, 3, 6, 10, &m_images);
-    // Files written here carry images only, and no file-level TREs.
-    out.writeBytes(kWrittenTail, sizeof kWrittenTail - 1);
+    writeImagesOnly(fp, headLayout(m_version));
 }
 
 __int64 CNitfFileHeaderV21::computeStorageLength() {
-    return identityLayout().length(m_properties) + originatorLayout(m_version).length(m_properties) +
-           lengthLayout().length(m_properties) + 3 + 16 * static_cast<__int64>(m_images.size()) +
-           static_cast<__int64>(sizeof kWrittenTail - 1);
+    return imagesOnlyLength(headLayout(m_version));
 }
 
 void CNitfFileHeaderV21::getTitle(char* title) {

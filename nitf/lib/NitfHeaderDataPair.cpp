@@ -1,17 +1,19 @@
 #include "NitfHeaderDataPair.h"
 
-CNitfHeaderDataPair::CNitfHeaderDataPair() : m_header(new CDataPointer), m_data(new CDataPointer) {}
+// The two records are allocated together: a file header holds one pair per segment, thousands for some.
+CNitfHeaderDataPair::CNitfHeaderDataPair() : m_header(new CDataPointer[2]), m_data(m_header + 1) {}
 
 CNitfHeaderDataPair::CNitfHeaderDataPair(__int64 headerOffset, int headerLength, __int64 dataLength)
-    : m_header(new CDataPointer(headerOffset, headerLength)),
-      m_data(new CDataPointer(headerOffset + headerLength, dataLength)) {}
+    : CNitfHeaderDataPair() {
+    setOffsets(headerOffset, headerLength, dataLength);
+}
 
-CNitfHeaderDataPair::CNitfHeaderDataPair(const CNitfHeaderDataPair& other)
-    : m_header(new CDataPointer(*other.m_header)), m_data(new CDataPointer(*other.m_data)) {}
+CNitfHeaderDataPair::CNitfHeaderDataPair(const CNitfHeaderDataPair& other) : CNitfHeaderDataPair() {
+    *this = other;
+}
 
 CNitfHeaderDataPair::~CNitfHeaderDataPair() {
-    delete m_header;
-    delete m_data;
+    delete[] m_header;
 }
 
 CNitfHeaderDataPair& CNitfHeaderDataPair::operator=(const CNitfHeaderDataPair& other) {

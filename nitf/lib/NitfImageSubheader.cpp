@@ -8,16 +8,17 @@
 #include "DataStreamWrite.h"
 #include "HostFile.h"
 #include "HostMemory.h"
+#include "KeyStore.h"
 #include "MAPLOBExtension.h"
 #include "RPFIMGExtension.h"
+#include "RecordLayout.h"
 #include "RpcSource.h"
-#include "Raise.h"
+#include "TagAreas.h"
 
-static const char kSourceFile[] = "nitf/lib/NitfImageSubheader";
+CNitfImageSubheader::CNitfImageSubheader() : m_propertiesModified(false), m_keys(new CKeyStore) {}
 
-CNitfImageSubheader::CNitfImageSubheader() : m_propertiesModified(false) {}
-
-CNitfImageSubheader::CNitfImageSubheader(const CNitfImageSubheader& other) : m_propertiesModified(false) {
+CNitfImageSubheader::CNitfImageSubheader(const CNitfImageSubheader& other)
+    : m_propertiesModified(false), m_keys(new CKeyStore) {
     *this = other;
 }
 
@@ -51,21 +52,12 @@ CNitfImageSubheader& CNitfImageSubheader::operator=(const CNitfImageSubheader& o
     m_georef = other.m_georef;
     for (const CNitfTag* tag : other.m_taggedRecords)
         m_taggedRecords.push_back(new CNitfTag(*tag));
-    for (const auto& entry : other.m_properties) {
-        const char* key = entry.first;
-        bool owned =
-            std::find(other.m_ownedNames.begin(), other.m_ownedNames.end(), key) != other.m_ownedNames.end();
-        if (owned) {
-            m_ownedNames.push_back(HString(key));
-            key = m_ownedNames.back();
-        }
-        SetProperty(m_properties, key, cloneProperty(entry.second));
-    }
-    m_fieldNames.clear();
-    for (const char* name : other.m_fieldNames) {
-        auto found = m_properties.find(const_cast<char*>(name));
-        m_fieldNames.push_back(found != m_properties.end() ? found->first : name);
-    }
+    // The keys are copied with the values: the other's band keys go with it.
+    for (const auto& entry : other.m_properties)
+        SetProperty(m_properties, m_keys->add(entry.first, std::strlen(entry.first)),
+                    cloneProperty(entry.second));
+    m_readLayout = other.m_readLayout;
+    m_readOffset = other.m_readOffset;
     m_propertiesModified = other.m_propertiesModified;
     return *this;
 }
@@ -83,10 +75,10 @@ void CNitfImageSubheader::clearContents() {
     m_luts.clear();
     CNitfTag::destroyList(m_taggedRecords);
     DestroyPropertyMap(m_properties);
-    for (char* name : m_ownedNames)
-        free(name);
-    m_ownedNames.clear();
-    m_fieldNames.clear();
+    m_keys->clear();
+    m_readLayout = nullptr;
+    m_fields.clear();
+    m_fieldsListed = false;
     m_georef = CNitfGeorefInfo();
 }
 
@@ -162,17 +154,6 @@ char* CNitfImageSubheader::bandFieldName(const char* name, int index, int count)
     return result;
 }
 
-const char* CNitfImageSubheader::ownBandFieldName(const char* name, int index, int count) {
-    char* key = bandFieldName(name, index, count);
-    auto found = m_properties.find(key);
-    if (found != m_properties.end()) {
-        free(key);
-        return found->first;
-    }
-    m_ownedNames.push_back(key);
-    return key;
-}
-
 int CNitfImageSubheader::getBandCount() {
     CNitfProperty* bands = FindProperty(m_properties, "NBANDS");
     int count = bands && bands->getDataType() != CNitfProperty::eNone ? bands->getAsInt() : 0;
@@ -186,146 +167,94 @@ int CNitfImageSubheader::getBandCount() {
 // ---- reading
 // ------------------------------------------------------------------------------------------------
 
-void CNitfImageSubheader::readField(FILE* fp, const char* name, int width) {
-    SetProperty(m_properties, name, CNitfProperty::getNewFromString(fp, width));
-    m_fieldNames.push_back(name);
-}
-
 // The representation codes that decide whether look-up tables are attached.
-static int representationCode(const char* irep) {
+static int representationCode(CNitfProperty* irep) {
     static const char* const codes[] = {"MONO    ", "RGB/LUT ", "RGB     ", "MULTI   ", "YCbCr601",
                                         "NODISPLY", "NVECTOR ", "POLAR   ", "VPH     "};
+    const char* text = irep && irep->getDataType() == CNitfProperty::eString ? irep->getAsString() : "";
     for (int i = 0; i < 9; ++i) {
-        if (std::strcmp(irep, codes[i]) == 0)
+        if (std::strcmp(text, codes[i]) == 0)
             return i + 1;
     }
     return 0;
 }
 
-static bool carriesComrat(const char* ic, bool allCompressed) {
-    if (allCompressed)
-        return std::strcmp(ic, "NC") != 0 && std::strcmp(ic, "NM") != 0;
-    // The list is closed on purpose: other codes (C0, C2, C6, C7, M0, ...) carry no COMRAT.
-    static const char* const codes[] = {"C1", "C3", "C4", "C5", "C8", "I1", "M1", "M3", "M4", "M5", "M8"};
-    for (const char* code : codes) {
-        if (std::strcmp(ic, code) == 0)
-            return true;
-    }
-    return false;
+// The integer value of a band's field (0 when absent).
+static int bandValue(PropertyMap& map, const char* name, int band, int count) {
+    char* key = CNitfImageSubheader::bandFieldName(name, band, count);
+    CNitfProperty* value = FindProperty(map, key);
+    free(key);
+    return value && value->getDataType() != CNitfProperty::eNone ? value->getAsInt() : 0;
 }
 
-void CNitfImageSubheader::readBand(FILE* fp, int band, int count, int representation) {
-    readField(fp, ownBandFieldName("IREPBAND", band, count), 2);
-    readField(fp, ownBandFieldName("ISUBCAT", band, count), 6);
-    readField(fp, ownBandFieldName("IFC", band, count), 1);
-    readField(fp, ownBandFieldName("IMFLT", band, count), 3);
-    const char* lutCountName = ownBandFieldName("NLUTS", band, count);
-    readField(fp, lutCountName, 1);
-    int tables = FindProperty(m_properties, lutCountName)->getAsInt();
-    if (tables == 0)
-        return;
-    const char* entriesName = ownBandFieldName("NELUT", band, count);
-    readField(fp, entriesName, 5);
-    int entries = FindProperty(m_properties, entriesName)->getAsInt();
-    if (tables < 0 || entries < 0)
-        return;
-
-    int type = CNitfLutSource::eEntryTypeNone;
-    if (tables == 3 && (representation == 1 || representation == 2 || representation == 4))
-        type = CNitfLutSource::eEntryTypeRGB;
-    else if (tables == 1 && representation == 1)
-        type = CNitfLutSource::eEntryTypeMono;
-    if (type != CNitfLutSource::eEntryTypeNone) {
-        CNitfLutSource* lut = addNewLutSource();
-        lut->setInterleaving(false);
-        lut->setEntryType(type);
-        lut->setEntryCount(entries);
-        lut->setEntryOffset(DKFTell(fp));
-        lut->setBand(band);
+static const record::Placed* findPlace(const std::vector<record::Placed>& places, const char* name) {
+    for (const record::Placed& place : places) {
+        if (std::strcmp(place.entry->name, name) == 0)
+            return &place;
     }
-    DKFSeek64(fp, static_cast<__int64>(tables) * entries, SEEK_CUR);
+    return nullptr;
 }
 
-void CNitfImageSubheader::readTagArea(FILE* fp, const char* lengthName) {
-    readField(fp, lengthName, 5);
-    int length = FindProperty(m_properties, lengthName)->getAsInt();
-    if (length <= 0)
-        return;
-    DKFSeek64(fp, 3, SEEK_CUR); // the overflow number: resolved when its data extension segment is read
-    CNitfTag::readArea(fp, length - 3, CNitfTag::eTagSourceImage, m_taggedRecords, true);
+const std::vector<NitfField_t>& CNitfImageSubheader::getFields() const {
+    if (!m_fieldsListed && m_readLayout) {
+        m_fields.clear();
+        m_readLayout->listFields(m_properties, m_readOffset, m_fields);
+    }
+    m_fieldsListed = true;
+    return m_fields;
 }
 
-void CNitfImageSubheader::readBody(FILE* fp, const BodyRules& rules) {
-    static const struct {
-        const char* name;
-        int width;
-    } identity[] = {{"ENCRYP", 1}, {"ISORCE", 42}, {"NROWS", 8}, {"NCOLS", 8}, {"PVTYPE", 3},
-                    {"IREP", 8},   {"ICAT", 8},    {"ABPP", 2},  {"PJUST", 1}, {"ICORDS", 1}};
-    for (const auto& field : identity)
-        readField(fp, field.name, field.width);
-    int representation = representationCode(FindProperty(m_properties, "IREP")->getAsString());
+void CNitfImageSubheader::readWith(FILE* fp, eNitfVersion_t version) {
+    clearContents();
+    std::vector<record::Placed> places;
+    places.reserve(8); // the TRE areas and their overflow numbers, comments, look-up tables
+    record::Report report;
+    report.places = &places;
+    report.start = &m_readOffset;
+    m_readLayout = &readLayout(version);
+    m_readLayout->read(fp, m_properties, *m_keys, report);
 
-    m_georef.setCoordinateType(FindProperty(m_properties, "ICORDS")->getAsString()[0], rules.version);
-    if (m_georef.hasCoordinates()) {
-        m_georef.setIgeoloOffset(DKFTell(fp));
-        for (const char* corner : {"IGEOLO1", "IGEOLO2", "IGEOLO3", "IGEOLO4"})
-            readField(fp, corner, 15);
+    CNitfProperty* icords = FindProperty(m_properties, "ICORDS");
+    m_georef.setCoordinateType(icords ? icords->getAsString()[0] : '\0', version);
+    const record::Placed* corners = findPlace(places, "IGEOLO1");
+    if (m_georef.hasCoordinates() && corners)
+        m_georef.setIgeoloOffset(corners->offset);
+
+    const int representation = representationCode(FindProperty(m_properties, "IREP"));
+    const int bands = getBandCount();
+    for (const record::Placed& place : places) {
+        const char* name = place.entry->name;
+        if (std::strcmp(name, "ICOM") == 0) {
+            m_comments.push_back(new CDataPointer(place.offset, 80));
+        } else if (std::strcmp(name, "LUTD") == 0) {
+            int band = static_cast<int>(place.index);
+            int tables = bandValue(m_properties, "NLUTS", band, bands);
+            int entries = bandValue(m_properties, "NELUT", band, bands);
+            int type = CNitfLutSource::eEntryTypeNone;
+            if (tables == 3 && (representation == 1 || representation == 2 || representation == 4))
+                type = CNitfLutSource::eEntryTypeRGB;
+            else if (tables == 1 && representation == 1)
+                type = CNitfLutSource::eEntryTypeMono;
+            if (type == CNitfLutSource::eEntryTypeNone || entries < 0)
+                continue;
+            CNitfLutSource* lut = addNewLutSource();
+            lut->setInterleaving(false);
+            lut->setEntryType(type);
+            lut->setEntryCount(entries);
+            lut->setEntryOffset(place.offset);
+            lut->setBand(band);
+        }
     }
-
-    readField(fp, "NICOM", 1);
-    int comments = FindProperty(m_properties, "NICOM")->getAsInt();
-    for (int i = 0; i < comments; ++i) {
-        m_comments.push_back(new CDataPointer(DKFTell(fp), 80));
-        DKFSeek64(fp, 80, SEEK_CUR);
-    }
-
-    readField(fp, "IC", 2);
-    if (carriesComrat(FindProperty(m_properties, "IC")->getAsString(), rules.comratForAllCompressed))
-        readField(fp, "COMRAT", 4);
-
-    readField(fp, "NBANDS", 1);
-    int bands = FindProperty(m_properties, "NBANDS")->getAsInt();
-    if (rules.hasXbands && std::strcmp(FindProperty(m_properties, "NBANDS")->getAsString(), "0") == 0) {
-        readField(fp, "XBANDS", 5);
-        bands = FindProperty(m_properties, "XBANDS")->getAsInt();
-    }
-    // Each band takes at least 13 bytes: a count the rest of the file cannot hold is damage, not data.
-    if (bands > 9 && static_cast<__int64>(bands) * 13 > CDataStream::remaining(fp))
-        NITF_RAISE_FORMAT("void __cdecl CNitfImageSubheader::read(" NITF_FILE_SIG ",enum eNitfVersion_t)",
-                          "Image band count %d runs past the end of the file", bands);
-    for (int band = 1; band <= bands; ++band)
-        readBand(fp, band, bands, representation);
-
-    static const struct {
-        const char* name;
-        int width;
-    } blocking[] = {{"ISYNC", 1}, {"IMODE", 1}, {"NBPR", 4},  {"NBPC", 4},  {"NPPBH", 4}, {"NPPBV", 4},
-                    {"NBPP", 2},  {"IDLVL", 3}, {"IALVL", 3}, {"ILOC", 10}, {"IMAG", 4}};
-    for (const auto& field : blocking)
-        readField(fp, field.name, field.width);
-
-    if (rules.hasTagAreas) {
-        readTagArea(fp, "UDIDL");
-        readTagArea(fp, "IXSHDL");
-    }
+    // The overflow numbers are not kept: an overflow is resolved when its data extension segment is read.
+    readTagAreas(places, {"UDID", "IXSHD"}, CNitfTag::eTagSourceImage, m_taggedRecords);
+    m_propertiesModified = false;
 }
 
 // ---- writing
 // ------------------------------------------------------------------------------------------------
 
-void CNitfImageSubheader::writeFields(FILE* fp, std::initializer_list<std::pair<const char*, int>> fields) {
-    for (const auto& field : fields) {
-        CNitfProperty* value = FindProperty(m_properties, field.first);
-        if (value)
-            value->writeString(fp, field.second);
-    }
-}
-
-void CNitfImageSubheader::writeBody(FILE* fp) {
-    CDataStreamWrite out(fp);
-    writeFields(fp, {{"ENCRYP", 1}, {"ISORCE", 42}, {"NROWS", 8}, {"NCOLS", 8}, {"PVTYPE", 3}});
-
-    int bands = getBandCount();
+void CNitfImageSubheader::writtenValues(PropertyMap& values, CKeyStore& keys) {
+    const int bands = getBandCount();
     CNitfLutSource* lut = getLutSource(0);
     // The representation follows from what is written, not from the map.
     const char* representation = "MULTI";
@@ -333,87 +262,83 @@ void CNitfImageSubheader::writeBody(FILE* fp) {
         representation = lut && lut->getEntrySize() == 3 ? "RGB/LUT" : "MONO";
     else if (bands == 3)
         representation = "RGB";
-    out.writeText(representation, 8);
+    SetProperty(values, "IREP", new CNitfProperty(representation));
+    SetProperty(values, "NICOM", new CNitfProperty("0")); // comments are never written
 
-    writeFields(fp, {{"ICAT", 8}, {"ABPP", 2}, {"PJUST", 1}, {"ICORDS", 1}});
-    if (m_georef.hasCoordinates()) {
-        // The corners are written here later, by the georeferencing.
-        m_georef.setIgeoloOffset(DKFTell(fp));
-        DKFSeek64(fp, 60, SEEK_CUR);
-    }
-    out.writeText("0", 1); // comments are never written
-
-    writeFields(fp, {{"IC", 2}});
-    CNitfProperty* ic = FindProperty(m_properties, "IC");
-    if (ic && ic->toText()[0] != 'N')
-        writeFields(fp, {{"COMRAT", 4}});
-    writeFields(fp, {{"NBANDS", 1}});
-    CNitfProperty* nbands = FindProperty(m_properties, "NBANDS");
-    if (nbands && nbands->getAsInt() == 0)
-        writeFields(fp, {{"XBANDS", 5}});
-
+    auto bandKey = [&](const char* name, int band) {
+        char* built = bandFieldName(name, band, bands);
+        char* key = keys.add(built, std::strlen(built));
+        free(built);
+        return key;
+    };
     for (int band = 1; band <= bands; ++band) {
-        if (bands > 1) {
-            char* name = bandFieldName("IREPBAND", band, bands);
-            writeFields(fp, {{name, 2}});
-            free(name);
-        } else {
-            out.writeText(lut && lut->getEntrySize() != 0 ? "LU" : "M", 2);
-        }
-        char* subcategory = bandFieldName("ISUBCAT", band, bands);
-        writeFields(fp, {{subcategory, 6}});
-        free(subcategory);
-        out.writeText("N", 1);
-        out.writeText("", 3);
+        if (bands == 1)
+            SetProperty(values, bandKey("IREPBAND", band),
+                        new CNitfProperty(lut && lut->getEntrySize() != 0 ? "LU" : "M"));
+        SetProperty(values, bandKey("IFC", band), new CNitfProperty("N"));
+        SetProperty(values, bandKey("IMFLT", band), new CNitfProperty(""));
         if (bands == 1 && lut) {
-            out.writeDecimal(lut->getEntrySize(), 1, true);
-            out.writeDecimal(lut->getEntryCount(), 5, true);
-            // The look-up table writes its entries here itself.
-            lut->setEntryOffset(DKFTell(fp));
-            DKFSeek64(fp, lut->getSize(), SEEK_CUR);
+            // The look-up table writes its entries at the place the walk leaves for them.
+            SetProperty(values, bandKey("NLUTS", band), new CNitfProperty(lut->getEntrySize()));
+            SetProperty(values, bandKey("NELUT", band), new CNitfProperty(lut->getEntryCount()));
         } else {
-            out.writeText("0", 1);
+            SetProperty(values, bandKey("NLUTS", band), new CNitfProperty("0"));
         }
     }
-
-    writeFields(fp, {{"ISYNC", 1},
-                     {"IMODE", 1},
-                     {"NBPR", 4},
-                     {"NBPC", 4},
-                     {"NPPBH", 4},
-                     {"NPPBV", 4},
-                     {"NBPP", 2},
-                     {"IDLVL", 3},
-                     {"IALVL", 3},
-                     {"ILOC", 10},
-                     {"IMAG", 4}});
 
     // Every TRE goes into the user-defined area; the extended area is always written empty.
     if (!m_taggedRecords.empty()) {
-        out.writeDecimal64(CNitfTag::computeListTotalLengths(&m_taggedRecords) + 3, 5, true);
-        out.writeText("000", 3);
-        for (CNitfTag* tag : m_taggedRecords)
-            tag->write(fp);
+        SetProperty(
+            values, "UDIDL",
+            new CNitfProperty(static_cast<int>(CNitfTag::computeListTotalLengths(&m_taggedRecords) + 3)));
+        SetProperty(values, "UDOFL", new CNitfProperty("000"));
     } else {
-        out.writeText("00000", 5);
+        SetProperty(values, "UDIDL", new CNitfProperty("00000"));
     }
-    out.writeText("00000", 5);
+    SetProperty(values, "IXSHDL", new CNitfProperty("00000"));
 }
 
-__int64 CNitfImageSubheader::computeBodyStorageLength(__int64 fixedLength) {
-    int bands = getBandCount();
-    __int64 length = fixedLength + (m_georef.hasCoordinates() ? 60 : 0);
-    CNitfProperty* ic = FindProperty(m_properties, "IC");
-    if (ic && ic->toText()[0] != 'N')
-        length += 4;
-    length += bands > 9 ? 6 : 1;
-    length += 13 * static_cast<__int64>(bands);
-    if (!m_luts.empty())
-        length += m_luts.front()->getSize() + 5;
-    length += 45;
-    if (!m_taggedRecords.empty())
-        length += CNitfTag::computeListTotalLengths(&m_taggedRecords) + 3;
-    length += 5;
+__int64 CNitfImageSubheader::writeWithLayout(FILE* fp) {
+    PropertyMap values;
+    CKeyStore keys;
+    std::vector<record::Placed> places;
+    record::Report report;
+    report.places = &places;
+    __int64 written = 0;
+    try {
+        writtenValues(values, keys);
+        written = writeLayout().write(fp, m_properties, &values, report);
+    } catch (...) {
+        DestroyPropertyMap(values);
+        throw;
+    }
+    DestroyPropertyMap(values);
+
+    // The corners, the look-up table and the TRE data are written at their places by their owners.
+    const record::Placed* corners = findPlace(places, "IGEOLO1");
+    if (corners)
+        m_georef.setIgeoloOffset(corners->offset);
+    CNitfLutSource* lut = getLutSource(0);
+    for (const record::Placed& place : places) {
+        if (lut && std::strcmp(place.entry->name, "LUTD") == 0)
+            lut->setEntryOffset(place.offset);
+    }
+    writeTagArea(fp, places, "UDID", m_taggedRecords);
+    return written;
+}
+
+__int64 CNitfImageSubheader::storageLength() {
+    PropertyMap values;
+    CKeyStore keys;
+    __int64 length = 0;
+    try {
+        writtenValues(values, keys);
+        length = writeLayout().length(m_properties, &values);
+    } catch (...) {
+        DestroyPropertyMap(values);
+        throw;
+    }
+    DestroyPropertyMap(values);
     // A sub-header read from a file still counts its old extended area here.
     CNitfProperty* extended = FindProperty(m_properties, "IXSHDL");
     if (extended && extended->getDataType() != CNitfProperty::eNone && extended->getAsInt() > 0)

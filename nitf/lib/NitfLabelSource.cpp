@@ -1,26 +1,30 @@
 #include "NitfLabelSource.h"
 
-#include "FieldLayout.h"
+#include "RecordLayout.h"
+#include "SecurityFields.h"
 
-static const CFieldLayout& labelLayout() {
-    static const CFieldLayout layout = CFieldLayout{{"LA", 2}, {"LID", 10}}
-                                           .add(CFieldLayout::security20("LS"))
-                                           .add(CFieldLayout{{"ENCRYP", 1},
-                                                             {"LFS", 1},
-                                                             {"LCW", 2},
-                                                             {"LCH", 2},
-                                                             {"LDLVL", 3},
-                                                             {"LALVL", 3},
-                                                             {"LLOC", 10},
-                                                             {"LTC", 3, FieldForm::Bytes},
-                                                             {"LBC", 3, FieldForm::Bytes}});
-    return layout;
-}
+using namespace record;
+
+// clang-format off
+static const Entry kHead[] = {
+    Text("LA", 2), Text("LID", 10),
+};
+static const Entry kTail[] = {
+    Text("ENCRYP", 1), Text("LFS", 1), Text("LCW", 2), Text("LCH", 2), Text("LDLVL", 3), Text("LALVL", 3),
+    Text("LLOC", 10), Bytes("LTC", 3, kTyped), Bytes("LBC", 3, kTyped),
+    Text("LXSHDL", 5),
+    IfNotZero("LXSHDL"),
+        Place("LXSOFL", 3),
+        TagArea("LXSHD", "LXSHDL"),
+    End(),
+};
+// clang-format on
 
 void CNitfLabelSource::read(CNitfFile* file, eNitfVersion_t, FILE* fp) {
+    const std::vector<Entry>& security = securityFields20("LS");
+    static const CRecordLayout layout({kHead, Part(security.data(), security.size()), kTail});
     clearContents();
     fp = positionAtSubheader(file, fp);
-    labelLayout().read(fp, m_properties, &m_fieldNames);
     // Labels have no TRE source of their own.
-    readTagArea(fp, "LXSHDL", CNitfTag::eTagSourceUnknown);
+    readFields(fp, layout, "LXSHD", CNitfTag::eTagSourceUnknown);
 }

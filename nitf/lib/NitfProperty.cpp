@@ -9,9 +9,18 @@
 #include "DataStreamWrite.h"
 #include "HostFile.h"
 #include "HostMemory.h"
+#include "PropertyPool.h"
 #include "Raise.h"
 
 static const char kSourceFile[] = "nitf/lib/NitfProperty";
+
+void* CNitfProperty::operator new(size_t size) {
+    return CPropertyPool::allocateObject(size);
+}
+
+void CNitfProperty::operator delete(void* object) {
+    CPropertyPool::releaseObject(object);
+}
 
 CNitfProperty::CNitfProperty() {
     baseConstruct();
@@ -49,7 +58,7 @@ void CNitfProperty::baseConstruct() {
 
 void CNitfProperty::release() {
     if (m_type == eString || m_type == eChars) {
-        free(m_value.text);
+        CPropertyPool::releaseText(m_value.text);
         m_value.text = nullptr;
         m_type = eNone;
     }
@@ -59,15 +68,27 @@ void CNitfProperty::release() {
 // ---- readers
 // -------------------------------------------------------------------------------------------------
 
+char* CNitfProperty::allocateBuffer(int length, FILE* fp) {
+    // Short reads leave zeros, never stale bytes; the buffer is always terminated.
+    size_t size = length > 0 ? static_cast<size_t>(length) : 0;
+    char* buffer = CPropertyPool::allocateText(size + 1);
+    size_t got = size ? DKFRead(buffer, 1, size, fp) : 0;
+    std::memset(buffer + got, 0, size + 1 - got);
+    return buffer;
+}
+
 void CNitfProperty::readString(FILE* fp, int length) {
+    char* text = allocateBuffer(length, fp);
     release();
-    m_value.text = CDataStreamRead(fp).readText(length);
+    m_value.text = text;
+    m_count = length > 0 ? length : 0;
     m_type = eString;
 }
 
 void CNitfProperty::readChars(FILE* fp, int length) {
+    char* bytes = allocateBuffer(length, fp);
     release();
-    m_value.text = CDataStreamRead(fp).readBytes(length);
+    m_value.text = bytes;
     m_count = length > 0 ? length : 0;
     m_type = eChars;
 }
@@ -146,26 +167,35 @@ CNitfProperty* CNitfProperty::getNewFromDouble(FILE* fp) {
 // ---- setters
 // --------------------------------------------------------------------------------------------------
 
+// A buffer of the pool holding `length` bytes of `text` and a NUL.
+static char* copyText(const char* text, size_t length) {
+    char* copy = CPropertyPool::allocateText(length + 1);
+    std::memcpy(copy, text, length);
+    copy[length] = '\0';
+    return copy;
+}
+
 void CNitfProperty::setString(const char* text) {
-    char* copy = HString(text ? text : "");
+    size_t length = text ? std::strlen(text) : 0;
+    char* copy = copyText(text ? text : "", length);
     release();
     m_value.text = copy;
+    m_count = length;
     m_type = eString;
 }
 
 void CNitfProperty::setString(const char* text, int length) {
     if (length < 0)
         length = 0;
-    char* copy = static_cast<char*>(HMalloc(static_cast<size_t>(length) + 1));
-    std::memcpy(copy, text, length);
-    copy[length] = '\0';
+    char* copy = copyText(text, static_cast<size_t>(length));
     release();
     m_value.text = copy;
+    m_count = static_cast<unsigned __int64>(length);
     m_type = eString;
 }
 
 void CNitfProperty::setCharsFromString(const char* text) {
-    char* copy = HString(text ? text : "");
+    char* copy = copyText(text ? text : "", text ? std::strlen(text) : 0);
     release();
     m_value.text = copy;
     m_count = std::strlen(copy);
@@ -182,6 +212,31 @@ void CNitfProperty::setInt4(int value) {
     release();
     m_value.integer = value;
     m_type = eInt4;
+}
+
+void CNitfProperty::setUint1(int value) {
+    release();
+    m_value.integer = value & 0xFF;
+    m_type = eUint1;
+}
+
+void CNitfProperty::setUint2(int value) {
+    release();
+    m_value.integer = value & 0xFFFF;
+    m_type = eUint2;
+}
+
+void CNitfProperty::setFloat(float value) {
+    release();
+    m_value.d = 0;
+    m_value.f = value;
+    m_type = eFloat;
+}
+
+void CNitfProperty::setDouble(double value) {
+    release();
+    m_value.d = value;
+    m_type = eDouble;
 }
 
 // ---- conversions

@@ -7,6 +7,8 @@
 #include "HostFile.h"
 #include "HostMemory.h"
 #include "NitfFile.h"
+#include "RecordLayout.h"
+#include "TagAreas.h"
 
 CNitfSegmentSource::CNitfSegmentSource()
     : m_subheaderOffset(0), m_dataOffset(0), m_dataLength(0), m_index(-1) {}
@@ -18,7 +20,9 @@ CNitfSegmentSource::~CNitfSegmentSource() {
 void CNitfSegmentSource::clearContents() {
     DestroyPropertyMap(m_properties);
     CNitfTag::destroyList(m_taggedRecords);
-    m_fieldNames.clear();
+    m_parts.clear();
+    m_fields.clear();
+    m_fieldsListed = false;
 }
 
 void CNitfSegmentSource::prepare(const CNitfHeaderDataPair* pair) {
@@ -44,15 +48,34 @@ FILE* CNitfSegmentSource::positionAtSubheader(CNitfFile* file, FILE* fp) {
     return fp;
 }
 
-void CNitfSegmentSource::readTagArea(FILE* fp, const char* lengthName, CNitfTag::eTagSource_t source) {
-    CNitfProperty* length = CNitfProperty::getNewFromString(fp, 5);
-    SetProperty(m_properties, lengthName, length);
-    m_fieldNames.push_back(lengthName);
-    int bytes = length->getAsInt();
-    if (bytes <= 0)
-        return;
-    DKFSeek64(fp, 3, SEEK_CUR); // the overflow number: resolved when its data extension segment is read
-    CNitfTag::readArea(fp, bytes - 3, source, m_taggedRecords, true);
+void CNitfSegmentSource::readFields(FILE* fp, const CRecordLayout& layout, const char* area,
+                                    CNitfTag::eTagSource_t source) {
+    std::vector<record::Placed> places;
+    record::Report report;
+    report.places = &places;
+    readPart(fp, layout, report);
+    // The overflow number is not kept: an overflow is resolved when its data extension segment is read.
+    if (area)
+        readTagAreas(places, {area}, source, m_taggedRecords);
+}
+
+void CNitfSegmentSource::readPart(FILE* fp, const CRecordLayout& layout, const record::Report& report) {
+    // Segment layouts have no repeated fields: no keys are built.
+    CKeyStore keys;
+    m_parts.emplace_back(&layout, 0);
+    record::Report withStart = report;
+    withStart.start = &m_parts.back().second;
+    layout.read(fp, m_properties, keys, withStart);
+}
+
+const std::vector<NitfField_t>& CNitfSegmentSource::getFields() const {
+    if (!m_fieldsListed) {
+        m_fields.clear();
+        for (const auto& part : m_parts)
+            part.first->listFields(m_properties, part.second, m_fields);
+        m_fieldsListed = true;
+    }
+    return m_fields;
 }
 
 char* CNitfSegmentSource::getNewData(CNitfFile* file) {

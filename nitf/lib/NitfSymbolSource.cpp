@@ -1,55 +1,45 @@
 #include "NitfSymbolSource.h"
 
-#include "FieldLayout.h"
+#include "RecordLayout.h"
+#include "SecurityFields.h"
 
+using namespace record;
+
+static Part part(const std::vector<Entry>& entries) {
+    return Part(entries.data(), entries.size());
+}
+
+// clang-format off
+static const Entry kHead[] = {
+    Text("SY", 2), Text("SID", 10), Text("SNAME", 20),
+};
+static const Entry kExtendedArea[] = {
+    Text("SXSHDL", 5),
+    IfNotZero("SXSHDL"),
+        Place("SXSOFL", 3),
+        TagArea("SXSHD", "SXSHDL"),
+    End(),
+};
 // NITF 2.1 / NSIF graphic (always CGM).
-static const CFieldLayout& graphicLayout() {
-    static const CFieldLayout layout = CFieldLayout{{"SY", 2}, {"SID", 10}, {"SNAME", 20}}
-                                           .add(CFieldLayout::security21("SS"))
-                                           .add(CFieldLayout{{"ENCRYP", 1},
-                                                             {"SFMT", 1},
-                                                             {"SSTRUCT", 13},
-                                                             {"SDLVL", 3},
-                                                             {"SALVL", 3},
-                                                             {"SLOC", 10},
-                                                             {"SBND1", 10},
-                                                             {"SCOLOR", 1},
-                                                             {"SBND2", 10},
-                                                             {"SRES2", 2}});
-    return layout;
-}
-
+static const Entry kGraphic[] = {
+    Text("ENCRYP", 1), Text("SFMT", 1), Text("SSTRUCT", 13), Text("SDLVL", 3), Text("SALVL", 3),
+    Text("SLOC", 10), Text("SBND1", 10), Text("SCOLOR", 1), Text("SBND2", 10), Text("SRES2", 2),
+};
 // NITF 2.0 symbol (bit-mapped, CGM or object). The symbol LUT is taken as three bytes per entry.
-static const CFieldLayout& symbolLayout() {
-    static const CFieldLayout layout = CFieldLayout{{"SY", 2}, {"SID", 10}, {"SNAME", 20}}
-                                           .add(CFieldLayout::security20("SS"))
-                                           .add(CFieldLayout{{"ENCRYP", 1},
-                                                             {"STYPE", 1},
-                                                             {"NLIPS", 4},
-                                                             {"NPIXPL", 4},
-                                                             {"NWDTH", 4},
-                                                             {"NBPP", 1},
-                                                             {"SDLVL", 3},
-                                                             {"SALVL", 3},
-                                                             {"SLOC", 10},
-                                                             {"SLOC2", 10},
-                                                             {"SCOLOR", 1},
-                                                             {"SNUM", 6},
-                                                             {"SROT", 3},
-                                                             {"NELUT", 3}});
-    return layout;
-}
+static const Entry kSymbol[] = {
+    Text("ENCRYP", 1), Text("STYPE", 1), Text("NLIPS", 4), Text("NPIXPL", 4), Text("NWDTH", 4), Text("NBPP", 1),
+    Text("SDLVL", 3), Text("SALVL", 3), Text("SLOC", 10), Text("SLOC2", 10), Text("SCOLOR", 1), Text("SNUM", 6),
+    Text("SROT", 3), Text("NELUT", 3),
+    IfNotZero("NELUT"),
+        field("DLUT", Width::OfField, eFieldBytes, 3, kTyped, "NELUT"),
+    End(),
+};
+// clang-format on
 
 void CNitfSymbolSource::read(CNitfFile* file, eNitfVersion_t version, FILE* fp) {
+    static const CRecordLayout graphic({kHead, part(securityFields21("SS")), kGraphic, kExtendedArea});
+    static const CRecordLayout symbol({kHead, part(securityFields20("SS")), kSymbol, kExtendedArea});
     clearContents();
     fp = positionAtSubheader(file, fp);
-    if (version == eNitfVersion20) {
-        symbolLayout().read(fp, m_properties, &m_fieldNames);
-        int entries = FindProperty(m_properties, "NELUT")->getAsInt();
-        if (entries > 0)
-            CFieldLayout{{"DLUT", 3 * entries, FieldForm::Bytes}}.read(fp, m_properties, &m_fieldNames);
-    } else {
-        graphicLayout().read(fp, m_properties, &m_fieldNames);
-    }
-    readTagArea(fp, "SXSHDL", CNitfTag::eTagSourceSymbol);
+    readFields(fp, version == eNitfVersion20 ? symbol : graphic, "SXSHD", CNitfTag::eTagSourceSymbol);
 }

@@ -1,5 +1,7 @@
 #include "NitfTag.h"
 
+#include <algorithm>
+#include <cstdlib>
 #include <cstring>
 
 #include "DataStreamRead.h"
@@ -37,6 +39,18 @@ long long CNitfTag::read(FILE* fp) {
         length = 0;
     m_data = CDataPointer(DKFTell(fp), length);
     DKFSeek64(fp, length, SEEK_CUR);
+    return length + getSize();
+}
+
+long long CNitfTag::read(const char* header, long long dataOffset) {
+    std::memcpy(m_identifier, header, 6);
+    m_identifier[6] = '\0';
+    char digits[6];
+    std::memcpy(digits, header + 6, 5);
+    digits[5] = '\0';
+    // A signed CEL would walk the reader backwards; no TRE has a negative length.
+    long long length = std::max(0, std::atoi(digits));
+    m_data = CDataPointer(dataOffset, length);
     return length + getSize();
 }
 
@@ -95,6 +109,20 @@ long long CNitfTag::readArea(FILE* fp, long long length, eTagSource_t source, st
         CNitfTag* tag = new CNitfTag;
         tag->setSource(source);
         consumed += tag->read(fp);
+        if (number)
+            tag->setOccurrence(list);
+        list.push_back(tag);
+    }
+    return consumed;
+}
+
+long long CNitfTag::readArea(const char* area, long long length, long long offset, eTagSource_t source,
+                             std::list<CNitfTag*>& list, bool number) {
+    long long consumed = 0;
+    while (consumed + getSize() <= length) {
+        CNitfTag* tag = new CNitfTag;
+        tag->setSource(source);
+        consumed += tag->read(area + consumed, offset + consumed + getSize());
         if (number)
             tag->setOccurrence(list);
         list.push_back(tag);

@@ -2,29 +2,39 @@
 
 #include "DataPointer.h"
 #include "DataStream.h"
-#include "FieldLayout.h"
 #include "NitfFile.h"
+#include "RecordLayout.h"
+#include "SecurityFields.h"
 
-static const CFieldLayout& textLayout21() {
-    static const CFieldLayout layout =
-        CFieldLayout{{"TE", 2}, {"TEXTID", 7}, {"TXTALVL", 3}, {"TXTDT", 14}, {"TXTITL", 80}}
-            .add(CFieldLayout::security21("TS"))
-            .add(CFieldLayout{{"ENCRYP", 1}, {"TXTFMT", 3}});
-    return layout;
+using namespace record;
+
+static Part part(const std::vector<Entry>& entries) {
+    return Part(entries.data(), entries.size());
 }
 
-static const CFieldLayout& textLayout20() {
-    static const CFieldLayout layout = CFieldLayout{{"TE", 2}, {"TEXTID", 10}, {"TXTDT", 14}, {"TXTITL", 80}}
-                                           .add(CFieldLayout::security20("TS"))
-                                           .add(CFieldLayout{{"ENCRYP", 1}, {"TXTFMT", 3}});
-    return layout;
-}
+// clang-format off
+static const Entry kHead21[] = {
+    Text("TE", 2), Text("TEXTID", 7), Text("TXTALVL", 3), Text("TXTDT", 14), Text("TXTITL", 80),
+};
+static const Entry kHead20[] = {
+    Text("TE", 2), Text("TEXTID", 10), Text("TXTDT", 14), Text("TXTITL", 80),
+};
+static const Entry kTail[] = {
+    Text("ENCRYP", 1), Text("TXTFMT", 3),
+    Text("TXSHDL", 5),
+    IfNotZero("TXSHDL"),
+        Place("TXSOFL", 3),
+        TagArea("TXSHD", "TXSHDL"),
+    End(),
+};
+// clang-format on
 
 void CNitfTextSource::read(CNitfFile* file, eNitfVersion_t version, FILE* fp) {
+    static const CRecordLayout text21({kHead21, part(securityFields21("TS")), kTail});
+    static const CRecordLayout text20({kHead20, part(securityFields20("TS")), kTail});
     clearContents();
     fp = positionAtSubheader(file, fp);
-    (version == eNitfVersion20 ? textLayout20() : textLayout21()).read(fp, m_properties, &m_fieldNames);
-    readTagArea(fp, "TXSHDL", CNitfTag::eTagSourceText);
+    readFields(fp, version == eNitfVersion20 ? text20 : text21, "TXSHD", CNitfTag::eTagSourceText);
 }
 
 void CNitfTextSource::readText(CNitfFile* file, char* buffer) {

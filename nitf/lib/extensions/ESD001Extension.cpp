@@ -1,7 +1,17 @@
 #include "ESD001Extension.h"
 
-#include "TreTables.h"
+#include "RecordLayout.h"
+
+using namespace record;
+
+// clang-format off
+// TREs without a published layout keep their whole data as one field.
+static const Entry kFields[] = {
+    RestOfData("ESD001_DATA"),
+};
+// clang-format on
 
 void CESD001Extension::readInfo(FILE* fp) {
-    readLayout(fp, tre::layouts::ESD001());
+    static const CRecordLayout layout(kFields);
+    readLayout(fp, layout);
 }

@@ -1,7 +1,16 @@
 #include "IMUDTGExtension.h"
 
-#include "TreTables.h"
+#include "RecordLayout.h"
+
+using namespace record;
+
+// clang-format off
+static const Entry kFields[] = {
+    RestOfData("IMUDTG_DATA"),
+};
+// clang-format on
 
 void CIMUDTGExtension::readInfo(FILE* fp) {
-    readLayout(fp, tre::layouts::IMUDTG());
+    static const CRecordLayout layout(kFields);
+    readLayout(fp, layout);
 }

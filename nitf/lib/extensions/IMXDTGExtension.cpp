@@ -1,7 +1,16 @@
 #include "IMXDTGExtension.h"
 
-#include "TreTables.h"
+#include "RecordLayout.h"
+
+using namespace record;
+
+// clang-format off
+static const Entry kFields[] = {
+    RestOfData("IMXDTG_DATA"),
+};
+// clang-format on
 
 void CIMXDTGExtension::readInfo(FILE* fp) {
-    readLayout(fp, tre::layouts::IMXDTG());
+    static const CRecordLayout layout(kFields);
+    readLayout(fp, layout);
 }

@@ -1,7 +1,17 @@
 #include "JITCIDExtension.h"
 
-#include "TreTables.h"
+#include "RecordLayout.h"
+
+using namespace record;
+
+// clang-format off
+// Test identification text: the whole data.
+static const Entry kFields[] = {
+    RestOfData("FILCMT"),
+};
+// clang-format on
 
 void CJITCIDExtension::readInfo(FILE* fp) {
-    readLayout(fp, tre::layouts::JITCID());
+    static const CRecordLayout layout(kFields);
+    readLayout(fp, layout);
 }

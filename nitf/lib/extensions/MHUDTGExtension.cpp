@@ -1,7 +1,16 @@
 #include "MHUDTGExtension.h"
 
-#include "TreTables.h"
+#include "RecordLayout.h"
+
+using namespace record;
+
+// clang-format off
+static const Entry kFields[] = {
+    RestOfData("MHUDTG_DATA"),
+};
+// clang-format on
 
 void CMHUDTGExtension::readInfo(FILE* fp) {
-    readLayout(fp, tre::layouts::MHUDTG());
+    static const CRecordLayout layout(kFields);
+    readLayout(fp, layout);
 }

@@ -1,7 +1,16 @@
 #include "MHXDTGExtension.h"
 
-#include "TreTables.h"
+#include "RecordLayout.h"
+
+using namespace record;
+
+// clang-format off
+static const Entry kFields[] = {
+    RestOfData("MHXDTG_DATA"),
+};
+// clang-format on
 
 void CMHXDTGExtension::readInfo(FILE* fp) {
-    readLayout(fp, tre::layouts::MHXDTG());
+    static const CRecordLayout layout(kFields);
+    readLayout(fp, layout);
 }

@@ -5,64 +5,25 @@
 #include <memory>
 #include <string>
 
-#include "ACFTBExtension.h"
-#include "AIMIDBExtension.h"
-#include "BANDSBExtension.h"
-#include "CSCCGAExtension.h"
-#include "CSCRNAExtension.h"
-#include "CSDIDAExtension.h"
-#include "CSEXRAExtension.h"
-#include "CSPROAExtension.h"
-#include "CSSFAAExtension.h"
-#include "ENGRDAExtension.h"
-#include "ESD001Extension.h"
-#include "GEOPSBExtension.h"
-#include "HISTOAExtension.h"
 #include "HostCompat.h"
 #include "HostConfig.h"
 #include "HostFile.h"
 #include "HostMemory.h"
-#include "ICHIPBExtension.h"
-#include "IMUDTGExtension.h"
-#include "IMXDTGExtension.h"
-#include "IOMAPAExtension.h"
-#include "J2KLRAExtension.h"
-#include "JITCIDExtension.h"
-#include "MAPLOBExtension.h"
-#include "MHUDTGExtension.h"
-#include "MHXDTGExtension.h"
-#include "MSTGTAExtension.h"
-#include "NBLOCAExtension.h"
 #include "NitfFile.h"
 #include "NitfTag.h"
-#include "PIAEQAExtension.h"
-#include "PIAEVAExtension.h"
-#include "PIAIMBExtension.h"
-#include "PIAIMCExtension.h"
-#include "PIAPEAExtension.h"
-#include "PIAPEBExtension.h"
-#include "PIAPRCExtension.h"
-#include "PIAPRDExtension.h"
-#include "PIATGAExtension.h"
-#include "PIATGBExtension.h"
-#include "PRJPSBExtension.h"
-#include "RPFHDRExtension.h"
 #include "RPFIMGExtension.h"
-#include "STDIDCExtension.h"
-#include "STREOBExtension.h"
-#include "TESTINExtension.h"
-#include "TreLayout.h"
-#include "USE00AExtension.h"
+#include "RecordLayout.h"
+#include "TreRegistry.h"
 
 // ---- construction and release
 // --------------------------------------------------------------------------------------
 
 CNitfExtension::CNitfExtension()
-    : m_dataOffset(0), m_dataLength(0), m_readLength(0), m_keys(std::make_shared<tre::KeyStore>()) {}
+    : m_dataOffset(0), m_dataLength(0), m_readLength(0), m_keys(std::make_shared<CKeyStore>()) {}
 
 CNitfExtension::CNitfExtension(const CNitfExtension& other)
     : m_dataOffset(other.m_dataOffset), m_dataLength(other.m_dataLength), m_properties(other.m_properties),
-      m_readLength(other.m_readLength), m_keys(other.m_keys) {}
+      m_readLength(other.m_readLength), m_fields(other.m_fields), m_keys(other.m_keys) {}
 
 CNitfExtension::~CNitfExtension() {
     // A copy shares the properties: the last one to go releases them (and, with the key store, their keys).
@@ -70,11 +31,11 @@ CNitfExtension::~CNitfExtension() {
         DestroyPropertyMap(m_properties);
 }
 
-tre::KeyStore& CNitfExtension::ownKeys() {
+CKeyStore& CNitfExtension::ownKeys() {
     if (m_keys.use_count() > 1) {
         // The shared properties stay with the copy; this extension starts afresh.
         m_properties.clear();
-        m_keys = std::make_shared<tre::KeyStore>();
+        m_keys = std::make_shared<CKeyStore>();
     }
     return *m_keys;
 }
@@ -87,38 +48,6 @@ void CNitfExtension::prepare(CNitfTag* tag) {
 // ---- the factory
 // ---------------------------------------------------------------------------------------------------
 
-template <typename Extension> static CNitfExtension* make() {
-    return new Extension;
-}
-
-// The identifiers Build recognises, in the order they are tried.
-static const struct {
-    const char* name;
-    CNitfExtension* (*create)();
-} kParsers[] = {
-    {"STDIDC", make<CSTDIDCExtension>}, {"AIMIDB", make<CAIMIDBExtension>},
-    {"ACFTB", make<CACFTBExtension>},   {"USE00A", make<CUSE00AExtension>},
-    {"STREOB", make<CSTREOBExtension>}, {"PIAIMB", make<CPIAIMBExtension>},
-    {"PIAIMC", make<CPIAIMCExtension>}, {"PIAPRC", make<CPIAPRCExtension>},
-    {"PIAPRD", make<CPIAPRDExtension>}, {"PIAPEA", make<CPIAPEAExtension>},
-    {"PIAPEB", make<CPIAPEBExtension>}, {"IOMAPA", make<CIOMAPAExtension>},
-    {"MSTGTA", make<CMSTGTAExtension>}, {"RPFHDR", make<CRPFHDRExtension>},
-    {"RPFIMG", make<CRPFIMGExtension>}, {"ESD001", make<CESD001Extension>},
-    {"J2KLRA", make<CJ2KLRAExtension>}, {"HISTOA", make<CHISTOAExtension>},
-    {"PIATGA", make<CPIATGAExtension>}, {"PIATGB", make<CPIATGBExtension>},
-    {"PIAEQA", make<CPIAEQAExtension>}, {"PIAEVA", make<CPIAEVAExtension>},
-    {"GEOPSB", make<CGEOPSBExtension>}, {"MHUDTG", make<CMHUDTGExtension>},
-    {"MHXDTG", make<CMHXDTGExtension>}, {"IMUDTG", make<CIMUDTGExtension>},
-    {"IMXDTG", make<CIMXDTGExtension>}, {"JITCID", make<CJITCIDExtension>},
-    {"TESTIN", make<CTESTINExtension>}, {"ENGRDA", make<CENGRDAExtension>},
-    {"BANDSB", make<CBANDSBExtension>}, {"NBLOCA", make<CNBLOCAExtension>},
-    {"ICHIPB", make<CICHIPBExtension>}, {"CSCRNA", make<CCSCRNAExtension>},
-    {"CSDIDA", make<CCSDIDAExtension>}, {"CSEXRA", make<CCSEXRAExtension>},
-    {"CSSFAA", make<CCSSFAAExtension>}, {"PRJPSB", make<CPRJPSBExtension>},
-    {"CSPROA", make<CCSPROAExtension>}, {"MAPLOB", make<CMAPLOBExtension>},
-    {"CSCCGA", make<CCSCCGAExtension>},
-};
-
 CNitfExtension* CNitfExtension::Build(CNitfTag* tag) {
     const char* identifier = tag->getIdentifier();
     // Identifiers of four or five significant characters stand blank-padded in the file and are not built
@@ -126,24 +55,15 @@ CNitfExtension* CNitfExtension::Build(CNitfTag* tag) {
     // character is NUL.
     if (identifier[4] == ' ' || identifier[5] == ' ')
         return nullptr;
-    for (const auto& parser : kParsers) {
-        if (_strnicmp(identifier, parser.name, 6) == 0) {
-            CNitfExtension* extension = parser.create();
+    for (const TreRegistration& tre : treRegistry()) {
+        if (tre.create && _strnicmp(identifier, tre.name, 6) == 0) {
+            CNitfExtension* extension = tre.create();
             extension->prepare(tag);
             return extension;
         }
     }
     return nullptr;
 }
-
-// The identifiers the library understands, by parser or (RPC00A/B) by the rational polynomial source.
-static const char* const kKnownExtensions[] = {
-    "ACFTB",  "AIMIDB", "BANDSB", "CSCCGA",  "CSCRNA", "CSDIDA", "CSEXRA", "CSPROA", "CSSFAA",
-    "ENGRDA", "ESD001", "GEOPSB", "HISTOA",  "MHUDTG", "MHXDTG", "IMUDTG", "IMXDTG", "ICHIPB",
-    "IOMAPA", "J2KLRA", "JITCID", "MAPLOB",  "MSTGTA", "NBLOCA", "PIAEQA", "PIAEVA", "PIAIMB",
-    "PIAIMC", "PIAPEA", "PIAPEB", "PIATGA",  "PIATGB", "PIAPRC", "PIAPRD", "PRJPSB", "RPFHDR",
-    "RPFIMG", "STDIDC", "STREOB", "TESTING", "USE00A", "RPC00B", "RPC00A",
-};
 
 bool CNitfExtension::isKnownExtension(const char* identifier) {
     // Identifiers of four or five significant characters stand blank-padded in the file.
@@ -153,11 +73,20 @@ bool CNitfExtension::isKnownExtension(const char* identifier) {
     else if (identifier[0] && identifier[1] && identifier[2] && identifier[3] && identifier[4] &&
              identifier[5] == ' ')
         compared = 5;
-    for (const char* name : kKnownExtensions) {
-        if (_strnicmp(identifier, name, compared) == 0)
+    for (const TreRegistration& tre : treRegistry()) {
+        if (_strnicmp(identifier, tre.name, compared) == 0)
             return true;
     }
     return false;
+}
+
+std::vector<const char*> CNitfExtension::getBuiltExtensionNames() {
+    std::vector<const char*> names;
+    for (const TreRegistration& tre : treRegistry()) {
+        if (tre.create)
+            names.push_back(tre.name);
+    }
+    return names;
 }
 
 // ---- reading
@@ -165,6 +94,7 @@ bool CNitfExtension::isKnownExtension(const char* identifier) {
 
 void CNitfExtension::readNewInfo(FILE* fp, bool flag) {
     DKFSeek64(fp, m_dataOffset, SEEK_SET);
+    m_fields.clear();
     if (m_dataLength <= 0) {
         m_readLength = 0; // no data, no fields
         return;
@@ -180,8 +110,10 @@ void CNitfExtension::readNewInfo(CNitfFile* file, bool flag) {
     readNewInfo(file->getInputStream(), flag);
 }
 
-void CNitfExtension::readLayout(FILE* fp, const tre::Layout& layout, __int64 externalCount) {
-    m_readLength = tre::readLayout(fp, layout, m_dataLength, m_properties, ownKeys(), externalCount);
+void CNitfExtension::readLayout(FILE* fp, const CRecordLayout& layout, __int64 externalCount) {
+    record::Report report;
+    report.fields = &m_fields;
+    m_readLength = layout.read(fp, m_properties, ownKeys(), report, m_dataLength, -1, externalCount);
 }
 
 unsigned __int64 CNitfExtension::getBinaryValue(CNitfProperty* field, int width) {

@@ -1,7 +1,24 @@
 #include "PIAEQAExtension.h"
 
-#include "TreTables.h"
+#include "RecordLayout.h"
+
+using namespace record;
+
+// clang-format off
+// Imagery access profile: equipment. 130 bytes
+static const Entry kFields[] = {
+    Text("EQPCODE", 7),
+    Text("EQPNOMEN", 45),
+    Text("EQPMAN", 64),
+    Text("OBTYPE", 1),
+    Text("ORDBAT", 3),
+    Text("CTRYPROD", 2),
+    Text("CTRYDSN", 2),
+    Text("OBJVIEW", 6),
+};
+// clang-format on
 
 void CPIAEQAExtension::readInfo(FILE* fp) {
-    readLayout(fp, tre::layouts::PIAEQA());
+    static const CRecordLayout layout(kFields);
+    readLayout(fp, layout);
 }

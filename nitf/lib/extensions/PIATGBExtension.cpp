@@ -1,7 +1,26 @@
 #include "PIATGBExtension.h"
 
-#include "TreTables.h"
+#include "RecordLayout.h"
+
+using namespace record;
+
+// clang-format off
+// Imagery access profile: target (version B), with decimal degrees. 117 bytes
+static const Entry kFields[] = {
+    Text("TGTUTM", 15),
+    Text("PIATGAID", 15),
+    Text("PIACTRY", 2),
+    Text("PIACAT", 5),
+    Text("TGTGEO", 15),
+    Text("DATUM", 3),
+    Text("TGTNAME", 38),
+    Text("PERCOVER", 3),
+    Text("TGTLAT", 10),
+    Text("TGTLON", 11),
+};
+// clang-format on
 
 void CPIATGBExtension::readInfo(FILE* fp) {
-    readLayout(fp, tre::layouts::PIATGB());
+    static const CRecordLayout layout(kFields);
+    readLayout(fp, layout);
 }

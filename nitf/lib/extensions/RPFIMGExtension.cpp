@@ -3,9 +3,9 @@
 #include <algorithm>
 #include <vector>
 
+#include "DataStream.h"
 #include "HostFile.h"
-#include "TreLayout.h"
-#include "TreTables.h"
+#include "RpfSections.h"
 
 namespace {
 
@@ -19,7 +19,8 @@ public:
     // Reads up to `length` bytes at the stream's position and puts the stream back there.
     Bytes(FILE* fp, __int64 length) {
         __int64 here = DKFTell(fp);
-        m_bytes.resize(static_cast<size_t>(std::max<__int64>(0, std::min(length, tre::bytesLeft(fp)))));
+        m_bytes.resize(
+            static_cast<size_t>(std::max<__int64>(0, std::min(length, CDataStream::remaining(fp)))));
         m_bytes.resize(DKFRead(m_bytes.data(), 1, m_bytes.size(), fp));
         DKFSeek64(fp, here, SEEK_SET);
     }
@@ -66,14 +67,14 @@ void CRPFIMGExtension::readInfo(FILE* fp) {
     __int64 start = DKFTell(fp);
     Bytes header(fp, kLocationHeaderLength);
     __int64 tableOffset = header.value(2, 4);
-    readLayout(fp, tre::layouts::RpfLocationHeader());
+    readLayout(fp, rpfsections::LocationHeader());
     __int64 headerLength = m_readLength;
     DKFSeek64(fp, start + tableOffset, SEEK_SET);
-    readLayout(fp, tre::layouts::RpfLocationRecords(), header.value(6, 2));
+    readLayout(fp, rpfsections::LocationRecords(), header.value(6, 2));
     m_readLength = m_readLength > 0 ? std::max(headerLength, tableOffset + m_readLength) : headerLength;
 }
 
-void CRPFIMGExtension::readRecords(FILE* fp, __int64 at, const tre::Layout& records, __int64 count) {
+void CRPFIMGExtension::readRecords(FILE* fp, __int64 at, const CRecordLayout& records, __int64 count) {
     __int64 headerLength = m_readLength;
     DKFSeek64(fp, at, SEEK_SET);
     readLayout(fp, records, count);
@@ -111,34 +112,34 @@ void CRPFIMGExtension::readRpfSections(FILE* fp, bool) {
         m_readLength = 0;
         switch (id) {
         case 130:
-            readLayout(fp, tre::layouts::RpfCoverage());
+            readLayout(fp, rpfsections::Coverage());
             break;
         case 131:
-            readLayout(fp, tre::layouts::RpfCompression());
+            readLayout(fp, rpfsections::Compression());
             lookupRecords = data.value(offset + 2, 2);
             break;
         case 132:
-            readLayout(fp, tre::layouts::RpfLookupHeader());
-            readRecords(fp, start + offset + data.value(offset, 4), tre::layouts::RpfLookupRecords(),
+            readLayout(fp, rpfsections::LookupHeader());
+            readRecords(fp, start + offset + data.value(offset, 4), rpfsections::LookupRecords(),
                         lookupRecords);
             break;
         case 134:
-            readLayout(fp, tre::layouts::RpfColorGrayscale());
+            readLayout(fp, rpfsections::ColorGrayscale());
             colormapRecords = data.value(offset, 1);
             break;
         case 135:
-            readLayout(fp, tre::layouts::RpfColormapHeader());
-            readRecords(fp, start + offset + data.value(offset, 4), tre::layouts::RpfColormapRecords(),
+            readLayout(fp, rpfsections::ColormapHeader());
+            readRecords(fp, start + offset + data.value(offset, 4), rpfsections::ColormapRecords(),
                         colormapRecords);
             break;
         case 136:
-            readLayout(fp, tre::layouts::RpfImageDescription());
+            readLayout(fp, rpfsections::ImageDescription());
             break;
         case 137:
-            readLayout(fp, tre::layouts::RpfImageDisplay());
+            readLayout(fp, rpfsections::ImageDisplay());
             break;
         case 138:
-            readLayout(fp, tre::layouts::RpfMask());
+            readLayout(fp, rpfsections::Mask());
             break;
         default:
             continue; // 133: compression parameters, not described

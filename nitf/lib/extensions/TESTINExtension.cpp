@@ -1,7 +1,16 @@
 #include "TESTINExtension.h"
 
-#include "TreTables.h"
+#include "RecordLayout.h"
+
+using namespace record;
+
+// clang-format off
+static const Entry kFields[] = {
+    RestOfData("TESTIN_DATA"),
+};
+// clang-format on
 
 void CTESTINExtension::readInfo(FILE* fp) {
-    readLayout(fp, tre::layouts::TESTIN());
+    static const CRecordLayout layout(kFields);
+    readLayout(fp, layout);
 }
