@@ -199,6 +199,20 @@ int ProjSetGeoreferenceFromCorners(ProjInfo_t* info, const double cornerX[4], co
         !allFinite(cornerY))
         return -1;
     enum { UL = 0, UR = 1, LR = 2, LL = 3 }; // NITF corner order
+    // Longitudes of an image across the antimeridian (174E to 169W) are taken on from the first corner
+    // (to 191E), so that the transform steps east rather than most of the way round the earth.
+    const double* given = cornerX;
+    double unwrapped[4];
+    for (int i = 0; i < 4; ++i) {
+        unwrapped[i] = cornerX[i];
+        if (info->system == PROJ_GEOGRAPHIC || info->system == PROJ_GEOCENTRIC) {
+            while (unwrapped[i] - cornerX[UL] > 180)
+                unwrapped[i] -= 360;
+            while (unwrapped[i] - cornerX[UL] < -180)
+                unwrapped[i] += 360;
+        }
+    }
+    cornerX = unwrapped;
     // An image one pixel wide or high has no extent along that axis, so its step there is zero.
     const double lastCol = width - 1, lastRow = height - 1;
     auto step = [](double from, double to, double span) { return span > 0 ? (to - from) / span : 0.0; };
@@ -226,7 +240,7 @@ int ProjSetGeoreferenceFromCorners(ProjInfo_t* info, const double cornerX[4], co
     }
     info->hasAffine = parallelogram ? 1 : 0;
     for (int i = 0; i < 4; ++i) {
-        info->cornerX[i] = cornerX[i];
+        info->cornerX[i] = given[i]; // as given: they are written back as they came
         info->cornerY[i] = cornerY[i];
     }
     info->width = width;

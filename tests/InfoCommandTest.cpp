@@ -214,3 +214,27 @@ TEST(InfoCommand, FixedLayoutsInTheirOrderAndBinaryFieldsAsNumbers) {
     for (char c : text)
         EXPECT_TRUE(c == '\n' || (c >= 0x20 && c < 0x7F)) << static_cast<int>(c);
 }
+
+// Where images lie: corners in decimal degrees and the projection record beside the raw IGEOLO, and an RPF
+// frame's own description.
+TEST(InfoCommand, ImagesCarryTheirGeoreferencingAndFramesTheirRpfDescription) {
+    const std::string root = corpusRoot();
+    if (root.empty())
+        GTEST_SKIP() << "no test corpus";
+    const json frame = infoOf(root + "/rpf/0000M033.GN3")["images"][0];
+    const json& place = frame["georeferencing"];
+    EXPECT_EQ(place["corner_source"], "RPF coverage") << place.dump();
+    ASSERT_EQ(place["corners"].size(), 4u);
+    EXPECT_NEAR(place["corners"][0]["latitude"].get<double>(), 51.923077, 1e-6);
+    EXPECT_NEAR(place["corners"][1]["longitude"].get<double>(), -168.75, 1e-9);
+    ASSERT_TRUE(place["projection"].contains("geotransform")) << place.dump();
+    EXPECT_GT(place["projection"]["geotransform"][1].get<double>(), 0) << "east across the antimeridian";
+    ASSERT_TRUE(frame.contains("rpf"));
+    EXPECT_EQ(frame["rpf"].dump().find("ZJKM35") != std::string::npos, true) << frame["rpf"].dump();
+
+    int status = 0;
+    const std::string text = runTool("info '" + root + "/rpf/0000M033.GN3'", status);
+    EXPECT_EQ(status, 0);
+    EXPECT_NE(text.find("corners from RPF coverage"), std::string::npos);
+    EXPECT_NE(text.find("location    ZJKM35"), std::string::npos);
+}

@@ -11,6 +11,7 @@
 
 #include "CommandLine.h"
 #include "Commands.h"
+#include "GeorefReport.h"
 #include "HostError.h"
 #include "HostFile.h"
 #include "NitfDataExtensionSource.h"
@@ -22,6 +23,7 @@
 #include "NitfLabelSource.h"
 #include "NitfSymbolSource.h"
 #include "NitfTextSource.h"
+#include "RpfFrameDescription.h"
 
 namespace {
 
@@ -152,11 +154,36 @@ Json imageSummary(CNitfImageSubheader& subheader, const CNitfHeaderDataPair* pai
     return summary;
 }
 
-Json describeImage(CNitfImageSubheader& subheader, const CNitfHeaderDataPair* pair, FILE* fp,
+// Where the image lies (corners in degrees, the projection record, a sensor model) and, for RPF frames, what
+// the frame says of itself: JSON objects for --json, the tool's text lines otherwise.
+void describePlacement(CNitfFileReader& reader, CNitfImageSubheader& subheader, int index,
+                       const Settings& settings, Json& image) {
+    const nitfgeoref::Summary summary = nitfgeoref::summarize(reader.getInputStream(), &subheader);
+    if (settings.json)
+        image["georeferencing"] = nitfgeoref::reportJson(summary);
+    else
+        image["georeferencingLines"] = nitfgeoref::reportLines(summary);
+    if (!reader.hasExtensionRpf())
+        return;
+    try {
+        const RpfFrameDescription frame = describeRpfFrame(reader, index);
+        if (settings.json)
+            image["rpf"] = frame.json;
+        else
+            image["rpfLines"] = frame.lines;
+    } catch (const vexo::Exception& e) {
+        image["rpfError"] = e.what();
+    }
+}
+
+Json describeImage(CNitfFileReader& reader, CNitfImageSubheader& subheader, int index,
                    const Settings& settings) {
+    FILE* fp = reader.getInputStream();
+    const CNitfHeaderDataPair* pair = reader.getFileHeader()->getImageHeaderDataPair(index);
     Json image = {{"summary", imageSummary(subheader, pair)},
                   {"subheader", fieldsOf(subheader.getProperties(), subheader.getFields())},
                   {"tres", tresOf(subheader.getTaggedRecords(), fp, settings)}};
+    describePlacement(reader, subheader, index, settings, image);
     Json comments = Json::array();
     for (int i = 0; i < subheader.getCommentCount(); ++i) {
         char comment[82];
@@ -255,7 +282,7 @@ Json describe(const std::string& path, const Settings& settings) {
     Json images = Json::array();
     for (int i = 0; i < header->getImageCount(); ++i) {
         std::unique_ptr<CNitfImageSubheader> subheader(header->getNewImageSubheader(fp, i));
-        images.push_back(describeImage(*subheader, header->getImageHeaderDataPair(i), fp, settings));
+        images.push_back(describeImage(reader, *subheader, i, settings));
     }
     Json graphics = Json::array(), labels = Json::array(), texts = Json::array();
     for (int i = 0; i < header->getSymbolCount(); ++i) {
@@ -350,6 +377,11 @@ void printSegments(const char* kind, const Json& segments) {
             std::printf("  %s\n", plain(kindName).c_str());
         for (const Json& comment : segment.value("comments", Json::array()))
             std::printf("  comment: %s\n", plain(comment).c_str());
+        for (const char* lines : {"georeferencingLines", "rpfLines"})
+            for (const Json& line : segment.value(lines, Json::array()))
+                std::printf("  %s\n", plain(line).c_str());
+        if (segment.contains("rpfError"))
+            std::printf("  RPF: %s\n", plain(segment["rpfError"]).c_str());
         printFields(segment["subheader"], "    ");
         printTres(segment["tres"], "    ");
     }
