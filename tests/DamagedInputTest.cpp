@@ -12,6 +12,9 @@
 #include "NitfImageSource.h"
 #include "NitfRegionReader.h"
 #include "NitfTestFile.h"
+#include "Canonical.h"
+#include "NitfFileReader.h"
+#include "NitfImageSubheader.h"
 #include "TestFiles.h"
 
 namespace {
@@ -184,4 +187,125 @@ TEST(DamagedExtract, ExitsNonZeroOnUnreadBlocksUnlessPartialIsAllowed) {
     EXPECT_EQ(output.read().size(), 1024u) << "what could be read is kept";
     EXPECT_EQ(run("--allow-partial"), 0);
     std::remove((output.path() + ".err").c_str());
+}
+
+namespace {
+
+// Runs `nitf info` (--json when asked) on a file; returns its standard output and the exit status.
+std::string runInfo(const std::string& path, bool json, int& status) {
+    const std::string command =
+        std::string(NITF_TOOL_PATH) + " info " + (json ? "--json " : "") + path + " 2>/dev/null";
+    FILE* pipe = popen(command.c_str(), "r");
+    std::string output;
+    char buffer[4096];
+    for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, pipe)) > 0;)
+        output.append(buffer, got);
+    const int raw = pclose(pipe);
+    status = WIFEXITED(raw) ? WEXITSTATUS(raw) : -1;
+    return output;
+}
+
+nitfsample::File twoImages() {
+    nitfsample::Image image;
+    image.cols = image.rows = 16;
+    nitfsample::File file;
+    file.images = {image, image};
+    file.images[1].iid1 = "SECOND";
+    return file;
+}
+
+} // namespace
+
+TEST(DamagedStructure, FilesCutShortAreNeverValid) {
+    const std::string bytes = nitfsample::build(twoImages());
+    CNitfFileReader whole;
+    ASSERT_TRUE(whole.openMemory(bytes.data(), bytes.size()));
+    const __int64 headerLength = whole.getFileHeader()->getImageHeaderDataPair(0)->getHeaderOffset();
+
+    // Nine bytes: no header at all.
+    TempFile nine("NITF02.10");
+    int status = 0;
+    runInfo(nine.path(), false, status);
+    EXPECT_EQ(status, 1);
+
+    // Cut right after the header: both images are listed, neither can be read; said, and exit 1.
+    TempFile cut(bytes.substr(0, static_cast<size_t>(headerLength)));
+    {
+        Warnings warnings;
+        CNitfFileReader reader;
+        ASSERT_TRUE(reader.open(cut.path().c_str()));
+        EXPECT_EQ(warnings.count("2 image segment(s) lie wholly or partly beyond the end of the file"), 1);
+        try {
+            delete reader.getNewImageSource(0);
+            FAIL() << "an image beyond the end of the file is refused";
+        } catch (const vexo::Exception& e) {
+            EXPECT_NE(std::string(e.what()).find("lies beyond the end of the file"), std::string::npos)
+                << e.what();
+        }
+    }
+    const std::string json = runInfo(cut.path(), true, status);
+    EXPECT_EQ(status, 1);
+    EXPECT_NE(json.find("\"error\""), std::string::npos);
+
+    // Cut inside the second image's sub-header: the first image reads whole.
+    TempFile inside(bytes.substr(0, bytes.size() - 300));
+    runInfo(inside.path(), false, status);
+    EXPECT_EQ(status, 1);
+    CNitfFileReader reader;
+    ASSERT_TRUE(reader.open(inside.path().c_str()));
+    EXPECT_NO_THROW(delete reader.getNewImageSource(0));
+    EXPECT_THROW(delete reader.getNewImageSource(1), vexo::Exception);
+}
+
+TEST(DamagedStructure, AnImpossibleHeaderLengthGivesWayToTheFields) {
+    const std::string good = nitfsample::build(twoImages());
+    for (const char* hl : {"000000", "      ", "999999", "000100"}) {
+        SCOPED_TRACE(std::string("HL \"") + hl + "\"");
+        nitfsample::File file = twoImages();
+        file.fields = {{"HL", hl}};
+        const std::string bytes = nitfsample::build(file);
+        Warnings warnings;
+        CNitfFileReader reader;
+        ASSERT_TRUE(reader.openMemory(bytes.data(), bytes.size()));
+        EXPECT_EQ(warnings.count("cannot be right"), 1);
+        std::unique_ptr<CNitfImageSubheader> second(
+            reader.getFileHeader()->getNewImageSubheader(reader.getInputStream(), 1));
+        ASSERT_TRUE(second);
+        EXPECT_EQ(FindProperty(second->getProperties(), "IID1")->toText(), "SECOND    ");
+        std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(1));
+        EXPECT_EQ(canonicalBand(reader, *source, 0).size(), 256u);
+    }
+}
+
+TEST(DamagedStructure, OneBadTreDoesNotBlockTheFile) {
+    // An ACFTB TRE far too short for its fields, between two good ones.
+    nitfsample::File file = twoImages();
+    file.images[0].udid = {{"USE00A", std::string(107, '0')}, {"ACFTB", "short"}, {"BANDSB", "x"}};
+    TempFile damaged(nitfsample::build(file));
+    int status = 0;
+    const std::string text = runInfo(damaged.path(), false, status);
+    EXPECT_EQ(status, 0);
+    EXPECT_NE(text.find("TRE USE00A"), std::string::npos);
+    EXPECT_NE(text.find("TRE ACFTB"), std::string::npos);
+    EXPECT_NE(text.find("Image 1:"), std::string::npos) << "the rest of the file is read";
+}
+
+TEST(DamagedStructure, RecordsPastTheEndOfTheFileAreCutWithAWarning) {
+    // A TRE whose length runs far past the end of a file whose image data also run past it: the size of the
+    // file stays what it is, the TRE is said to be cut, the image reads what is there.
+    nitfsample::Image image;
+    image.cols = image.rows = 16;
+    image.udid = {{"USE00A", std::string(107, '0')}};
+    nitfsample::File file;
+    file.images = {image};
+    std::string bytes = nitfsample::build(file);
+    const size_t cel = bytes.find("USE00A") + 6;
+    bytes.replace(cel, 5, "99999");
+    Warnings warnings;
+    CNitfFileReader reader;
+    ASSERT_TRUE(reader.openMemory(bytes.data(), bytes.size()));
+    std::unique_ptr<CNitfImageSubheader> subheader(
+        reader.getFileHeader()->getNewImageSubheader(reader.getInputStream(), 0));
+    EXPECT_EQ(warnings.count("TRE USE00A (99999 bytes) runs past the end of the file"), 1);
+    EXPECT_EQ(DKSize(reader.getInputStream()), static_cast<__int64>(bytes.size()));
 }

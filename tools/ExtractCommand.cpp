@@ -6,8 +6,6 @@
 #include <cstdlib>
 #include <cstring>
 #include <memory>
-#include <mutex>
-#include <set>
 #include <stdexcept>
 #include <string>
 #include <thread>
@@ -138,26 +136,6 @@ CNitfImageSource* openImage(CNitfFileReader& reader, int image) {
     return reader.getNewImageSource(image);
 }
 
-// Library warnings on stderr, naming the file, each once (several decoding threads meet the same causes).
-class WarningsOnStderr {
-public:
-    explicit WarningsOnStderr(const std::string& file) {
-        m_previous = vexo::nspio::Warning::setHandler([this, file](const char* message, const char*, int) {
-            std::lock_guard<std::mutex> lock(m_mutex);
-            if (m_seen.insert(message).second)
-                std::fprintf(stderr, "nitf extract: %s: warning: %s\n", file.c_str(), message);
-        });
-    }
-    ~WarningsOnStderr() { vexo::nspio::Warning::setHandler(m_previous); }
-    WarningsOnStderr(const WarningsOnStderr&) = delete;
-    WarningsOnStderr& operator=(const WarningsOnStderr&) = delete;
-
-private:
-    vexo::nspio::Warning::Handler m_previous;
-    std::mutex m_mutex;
-    std::set<std::string> m_seen;
-};
-
 // The GeoTIFF writer makes the file itself (it lays out a COG in a second pass).
 int extractTiff(const Options& options) {
     CNitfFileReader reader;
@@ -182,7 +160,7 @@ int extractTiff(const Options& options) {
 }
 
 int extract(const Options& options) {
-    WarningsOnStderr warnings(options.file);
+    cli::WarningsOnStderr warnings("extract", options.file);
     if (options.format == "tiff")
         return extractTiff(options);
     OutputFile out(options.output);

@@ -3,6 +3,7 @@
 // of each image with its numbers as numbers.
 #include <cstdio>
 #include <cstring>
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -273,30 +274,40 @@ Json describe(const std::string& path, const Settings& settings) {
         {"label", header->getLabelCount()},       {"text", header->getTextCount()},
         {"des", header->getDataExtensionCount()}, {"res", header->getReservedExtensionCount()}};
 
+    // Each segment on its own: one that cannot be read is reported in its place ("error") and the others are
+    // still described.
+    auto each = [&](int count, Json& list, const std::function<Json(int)>& one) {
+        for (int i = 0; i < count; ++i) {
+            try {
+                list.push_back(one(i));
+            } catch (const vexo::Exception& e) {
+                list.push_back(Json{{"error", e.what()}});
+            }
+        }
+    };
     // Overflow segments first: their TREs join the lists of the headers they overflowed from.
-    Json des = Json::array();
-    for (int i = 0; i < header->getDataExtensionCount(); ++i) {
+    Json des = Json::array(), images = Json::array();
+    each(header->getDataExtensionCount(), des, [&](int i) {
         std::unique_ptr<CNitfDataExtensionSource> segment(reader.getNewDataExtensionSource(i));
-        des.push_back(describeDes(*segment, fp, settings));
-    }
-    Json images = Json::array();
-    for (int i = 0; i < header->getImageCount(); ++i) {
+        return describeDes(*segment, fp, settings);
+    });
+    each(header->getImageCount(), images, [&](int i) {
         std::unique_ptr<CNitfImageSubheader> subheader(header->getNewImageSubheader(fp, i));
-        images.push_back(describeImage(reader, *subheader, i, settings));
-    }
+        return describeImage(reader, *subheader, i, settings);
+    });
     Json graphics = Json::array(), labels = Json::array(), texts = Json::array();
-    for (int i = 0; i < header->getSymbolCount(); ++i) {
+    each(header->getSymbolCount(), graphics, [&](int i) {
         std::unique_ptr<CNitfSymbolSource> graphic(reader.getNewSymbolSource(i));
-        graphics.push_back(describeSegment(*graphic, graphic->getTaggedRecords(), fp, settings));
-    }
-    for (int i = 0; i < header->getLabelCount(); ++i) {
+        return describeSegment(*graphic, graphic->getTaggedRecords(), fp, settings);
+    });
+    each(header->getLabelCount(), labels, [&](int i) {
         std::unique_ptr<CNitfLabelSource> label(reader.getNewLabelSource(i));
-        labels.push_back(describeSegment(*label, label->getTaggedRecords(), fp, settings));
-    }
-    for (int i = 0; i < header->getTextCount(); ++i) {
+        return describeSegment(*label, label->getTaggedRecords(), fp, settings);
+    });
+    each(header->getTextCount(), texts, [&](int i) {
         std::unique_ptr<CNitfTextSource> text(reader.getNewTextSource(i));
-        texts.push_back(describeSegment(*text, text->getTaggedRecords(), fp, settings));
-    }
+        return describeSegment(*text, text->getTaggedRecords(), fp, settings);
+    });
     info["header"] = describeHeader(*header);
     info["tres"] = tresOf(header->getTaggedRecords(), fp, settings);
     info["images"] = images;
@@ -368,6 +379,10 @@ void printSegments(const char* kind, const Json& segments) {
     for (size_t i = 0; i < segments.size(); ++i) {
         const Json& segment = segments[i];
         std::printf("\n%s %zu:\n", kind, i);
+        if (segment.contains("error")) {
+            std::printf("  not readable: %s\n", plain(segment["error"]).c_str());
+            continue;
+        }
         if (segment.contains("summary"))
             printImageSummary(segment["summary"]);
         if (segment.contains("dataLength"))
@@ -428,8 +443,17 @@ int runInfo(int argc, char** argv) {
     Json all = Json::array();
     int failures = 0;
     for (const std::string& path : options.operands()) {
+        cli::WarningsOnStderr warnings("info", path);
         try {
             Json info = describe(path, settings);
+            // A segment that cannot be read makes the file not a valid one.
+            for (const char* list : {"images", "graphics", "labels", "texts", "des"})
+                for (const Json& segment : info[list])
+                    if (segment.contains("error")) {
+                        cli::reportError("info", path,
+                                         std::string(list) + ": " + segment["error"].get<std::string>());
+                        ++failures;
+                    }
             if (settings.json)
                 all.push_back(info);
             else

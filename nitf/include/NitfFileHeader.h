@@ -77,6 +77,11 @@ public:
     // The header's storage length plus the image segments (the other segment types are not counted).
     __int64 computeFileLength();
 
+    // Raises vexo::Exception when the sub-header of segment `index` of `kind` ("image", "graphic", ...) is
+    // not wholly in the file: every field after the end would read as blanks.
+    static void requireSubheaderInFile(FILE* fp, const CNitfHeaderDataPair* pair, const char* kind,
+                                       int index);
+
 protected:
     // Reads the user-defined and extended header data: UDHDL and XHDL, then the TREs of each area (the
     // overflow numbers are skipped).
@@ -85,6 +90,12 @@ protected:
     // total.
     __int64 readSegmentTable(FILE* fp, const char* countName, __int64 firstOffset, int headerLengthWidth,
                              int dataLengthWidth, std::vector<CNitfHeaderDataPair*>* list);
+    // After the segment tables and tag areas have been read (the header's fields end at `fieldsEnd`): an HL
+    // that cannot be right (not a number, 0, all nines, shorter than the fields or longer than the file)
+    // gives way to the length the fields imply, with a warning, and the segments are placed after it.
+    void checkHeaderLength(FILE* fp, __int64 fieldsEnd);
+    // Warns, once per segment type, of segments whose sub-header or data lie past the end of the file.
+    void checkSegmentsInFile(FILE* fp);
     void recordField(const char* name, int width, __int64 offset) {
         m_fields.push_back({name, eFieldText, width, offset});
     }
@@ -119,6 +130,7 @@ private:
 template <typename Subheader> CNitfImageSubheader* CNitfFileHeader::readImageSubheader(FILE* fp, int index) {
     if (!getImageHeaderDataPair(index))
         return nullptr;
+    requireSubheaderInFile(fp, getImageHeaderDataPair(index), "image", index);
     seekToImageSubheader(fp, index);
     Subheader* subheader = new Subheader;
     try {

@@ -22,4 +22,5 @@ private:
     __int64 findStreamingHeader(FILE* fp);
 
     bool m_streamingReplacement = false;
+    __int64 m_fieldsEnd = -1; // where the fields end (after the tag areas); -1 when reading stopped early
 };

@@ -4,9 +4,13 @@
 
 #include "DataStreamRead.h"
 #include "DataStreamWrite.h"
+#include "HostError.h"
 #include "HostFile.h"
+#include "Raise.h"
 #include "RecordLayout.h"
 #include "TagAreas.h"
+
+static const char kSourceFile[] = "nitf/lib/NitfFileHeader";
 
 CNitfFileHeader::CNitfFileHeader(eNitfVersion_t version) : m_version(version), m_propertiesModified(false) {}
 
@@ -142,6 +146,87 @@ void CNitfFileHeader::readTagAreas(FILE* fp) {
     layout.read(fp, m_properties, keys, report);
     // The overflow numbers are not kept: an overflow is resolved when its data extension segment is read.
     ::readTagAreas(places, {"UDHD", "XHD"}, CNitfTag::eTagSourceFileHeader, m_taggedRecords);
+}
+
+// ---- what the file holds --------------------------------------------------------------------------------
+
+namespace {
+
+void warn(const std::string& message) {
+    vexo::nspio::Warning::Warn(message.c_str(), kSourceFile, __LINE__);
+}
+
+} // namespace
+
+void CNitfFileHeader::requireSubheaderInFile(FILE* fp, const CNitfHeaderDataPair* pair, const char* kind,
+                                             int index) {
+    const __int64 size = DKSize(fp);
+    if (!pair || size < 0 || pair->getHeaderEnd() <= size)
+        return;
+    static const char signature[] = "void __cdecl CNitfFileHeader::requireSubheaderInFile(" NITF_FILE_SIG
+                                    ",const class CNitfHeaderDataPair *,const char *,int)";
+    if (pair->getHeaderOffset() >= size)
+        NITF_RAISE_FORMAT(
+            signature,
+            "The sub-header of %s segment %d (at byte %lld) lies beyond the end of the file (%lld bytes)",
+            kind, index, static_cast<long long>(pair->getHeaderOffset()), static_cast<long long>(size));
+    NITF_RAISE_FORMAT(
+        signature,
+        "The sub-header of %s segment %d is cut short by the end of the file (%lld of its %lld bytes)", kind,
+        index, static_cast<long long>(size - pair->getHeaderOffset()),
+        static_cast<long long>(pair->getHeaderLength()));
+}
+
+void CNitfFileHeader::checkHeaderLength(FILE* fp, __int64 fieldsEnd) {
+    CNitfProperty* field = FindProperty(m_properties, "HL");
+    const std::string text = field ? field->toText() : std::string();
+    const bool digits = !text.empty() && text.find_first_not_of("0123456789") == std::string::npos;
+    const __int64 declared = digits ? field->getAsInt64() : 0;
+    const __int64 size = DKSize(fp);
+    const bool allNines = digits && text.find_first_not_of('9') == std::string::npos;
+    if (digits && !allNines && declared >= fieldsEnd && (size < 0 || declared <= size))
+        return;
+    warn("The file header's length (HL \"" + nitf_detail::printable(text) +
+         "\") cannot be right: its fields end at byte " + std::to_string(fieldsEnd) +
+         ", where the segments are read from");
+    const __int64 shift = fieldsEnd - (field ? field->getAsInt64() : 0);
+    for (auto* list : {&m_images, &m_symbols, &m_labels, &m_texts, &m_dataExtensions, &m_reservedExtensions})
+        for (CNitfHeaderDataPair* pair : *list)
+            pair->setOffsets(pair->getHeaderOffset() + shift, pair->getHeaderLength(), pair->getDataLength());
+}
+
+void CNitfFileHeader::checkSegmentsInFile(FILE* fp) {
+    const __int64 size = DKSize(fp);
+    if (size < 0)
+        return;
+    const struct {
+        const std::vector<CNitfHeaderDataPair*>* list;
+        const char* kind;
+    } types[] = {{&m_images, "image"},
+                 {&m_symbols, "graphic"},
+                 {&m_labels, "label"},
+                 {&m_texts, "text"},
+                 {&m_dataExtensions, "data extension"},
+                 {&m_reservedExtensions, "reserved extension"}};
+    for (const auto& type : types) {
+        int beyond = 0, cut = 0, first = -1;
+        for (size_t i = 0; i < type.list->size(); ++i) {
+            const CNitfHeaderDataPair* pair = (*type.list)[i];
+            if (pair->getDataEnd() <= size)
+                continue;
+            ++(pair->getHeaderEnd() > size ? beyond : cut);
+            if (first < 0)
+                first = static_cast<int>(i);
+        }
+        if (beyond > 0)
+            warn(std::to_string(beyond) + " " + type.kind +
+                 " segment(s) lie wholly or partly beyond the end of the file (" + std::to_string(size) +
+                 " bytes), the first being " + type.kind + " " + std::to_string(first));
+        else if (cut > 0)
+            warn(std::to_string(cut) + " " + type.kind +
+                 " segment(s) have data running past the end of the file (" + std::to_string(size) +
+                 " bytes), the first being " + type.kind + " " + std::to_string(first));
+    }
 }
 
 void CNitfFileHeader::seekToImageSubheader(FILE* fp, int index) {

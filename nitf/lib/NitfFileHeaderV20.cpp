@@ -49,6 +49,8 @@ void CNitfFileHeaderV20::read(FILE* fp, CNitfFileReader*) {
     offset += readSegmentTable(fp, "NUMDES", offset, 4, 9, &m_dataExtensions);
     offset += readSegmentTable(fp, "NUMRES", offset, 4, 7, &m_reservedExtensions);
     readTagAreas(fp);
+    checkHeaderLength(fp, DKFTell(fp));
+    checkSegmentsInFile(fp);
     m_propertiesModified = false;
 }
 

@@ -80,11 +80,13 @@ void CNitfFileHeaderV21::readFields(FILE* fp) {
     offset += readSegmentTable(fp, "NUMDES", offset, 4, 9, &m_dataExtensions);
     offset += readSegmentTable(fp, "NUMRES", offset, 4, 7, &m_reservedExtensions);
     readTagAreas(fp);
+    m_fieldsEnd = DKFTell(fp);
 }
 
 void CNitfFileHeaderV21::read(FILE* fp, CNitfFileReader*) {
     clearContents();
     m_streamingReplacement = false;
+    m_fieldsEnd = -1;
     readFields(fp);
 
     // A streaming writer leaves the lengths as nines and carries the real header in its last segment.
@@ -98,6 +100,10 @@ void CNitfFileHeaderV21::read(FILE* fp, CNitfFileReader*) {
             m_streamingReplacement = true;
         }
     }
+    // A replacement header stands at the end of the file: its length describes the header at the start.
+    if (!m_streamingReplacement && m_fieldsEnd >= 0)
+        checkHeaderLength(fp, m_fieldsEnd);
+    checkSegmentsInFile(fp);
     m_propertiesModified = false;
 }
 

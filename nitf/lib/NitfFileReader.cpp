@@ -111,7 +111,8 @@ namespace {
 // Builds a segment object for the pair at `index` and lets it read its sub-header; the caller owns the
 // result.
 template <typename Source, typename Read>
-Source* newSegment(CNitfHeaderDataPair* pair, int index, Read read) {
+Source* newSegment(FILE* fp, CNitfHeaderDataPair* pair, const char* kind, int index, Read read) {
+    CNitfFileHeader::requireSubheaderInFile(fp, pair, kind, index);
     Source* source = new Source;
     try {
         source->prepare(pair);
@@ -131,8 +132,9 @@ CNitfSymbolSource* CNitfFileReader::getNewSymbolSource(int index) {
     if (!pair)
         NITF_RAISE("Invalid symbol index",
                    "class CNitfSymbolSource *__cdecl CNitfFileReader::getNewSymbolSource(int)");
-    return newSegment<CNitfSymbolSource>(
-        pair, index, [&](CNitfSymbolSource& source) { source.read(this, m_header->getVersion(), nullptr); });
+    return newSegment<CNitfSymbolSource>(m_fp, pair, "graphic", index, [&](CNitfSymbolSource& source) {
+        source.read(this, m_header->getVersion(), nullptr);
+    });
 }
 
 CNitfLabelSource* CNitfFileReader::getNewLabelSource(int index) {
@@ -140,8 +142,9 @@ CNitfLabelSource* CNitfFileReader::getNewLabelSource(int index) {
     if (!pair)
         NITF_RAISE("Invalid label index",
                    "class CNitfLabelSource *__cdecl CNitfFileReader::getNewLabelSource(int)");
-    return newSegment<CNitfLabelSource>(
-        pair, index, [&](CNitfLabelSource& source) { source.read(this, m_header->getVersion(), nullptr); });
+    return newSegment<CNitfLabelSource>(m_fp, pair, "label", index, [&](CNitfLabelSource& source) {
+        source.read(this, m_header->getVersion(), nullptr);
+    });
 }
 
 CNitfTextSource* CNitfFileReader::getNewTextSource(int index) {
@@ -149,8 +152,9 @@ CNitfTextSource* CNitfFileReader::getNewTextSource(int index) {
     if (!pair)
         NITF_RAISE("Invalid text index",
                    "class CNitfTextSource *__cdecl CNitfFileReader::getNewTextSource(int)");
-    return newSegment<CNitfTextSource>(
-        pair, index, [&](CNitfTextSource& source) { source.read(this, m_header->getVersion(), nullptr); });
+    return newSegment<CNitfTextSource>(m_fp, pair, "text", index, [&](CNitfTextSource& source) {
+        source.read(this, m_header->getVersion(), nullptr);
+    });
 }
 
 CNitfDataExtensionSource* CNitfFileReader::getNewDataExtensionSource(int index) {
@@ -159,9 +163,10 @@ CNitfDataExtensionSource* CNitfFileReader::getNewDataExtensionSource(int index) 
     if (!pair)
         NITF_RAISE("Invalid data extension index",
                    "class CNitfDataExtensionSource *__cdecl CNitfFileReader::getNewDataExtensionSource(int)");
-    return newSegment<CNitfDataExtensionSource>(pair, index, [&](CNitfDataExtensionSource& source) {
-        source.read(this, m_header->getVersion(), nullptr, nullptr, nullptr);
-    });
+    return newSegment<CNitfDataExtensionSource>(
+        m_fp, pair, "data extension", index, [&](CNitfDataExtensionSource& source) {
+            source.read(this, m_header->getVersion(), nullptr, nullptr, nullptr);
+        });
 }
 
 namespace {

@@ -6,14 +6,18 @@
 
 #include "DataStream.h"
 #include "DataStreamWrite.h"
+#include "HostError.h"
 #include "HostFile.h"
 #include "HostMemory.h"
 #include "KeyStore.h"
 #include "MAPLOBExtension.h"
 #include "RPFIMGExtension.h"
+#include "Raise.h"
 #include "RecordLayout.h"
 #include "RpcSource.h"
 #include "TagAreas.h"
+
+static const char kSourceFile[] = "nitf/lib/NitfImageSubheader";
 
 CNitfImageSubheader::CNitfImageSubheader() : m_propertiesModified(false), m_keys(new CKeyStore) {}
 
@@ -247,7 +251,33 @@ void CNitfImageSubheader::readWith(FILE* fp, eNitfVersion_t version) {
     }
     // The overflow numbers are not kept: an overflow is resolved when its data extension segment is read.
     readTagAreas(places, {"UDID", "IXSHD"}, CNitfTag::eTagSourceImage, m_taggedRecords);
+    warnOfRecordsPastTheEnd(fp);
     m_propertiesModified = false;
+}
+
+// TREs and look-up tables whose lengths reach past the end of the file: what is missing reads as blanks or
+// zeros, and saying so is all that helps a reader of the file.
+void CNitfImageSubheader::warnOfRecordsPastTheEnd(FILE* fp) {
+    const __int64 size = DKSize(fp);
+    if (size < 0)
+        return;
+    for (CNitfTag* tag : m_taggedRecords) {
+        if (tag->getDataOffset() + tag->getDataLength() <= size)
+            continue;
+        const std::string message =
+            std::string("The image TRE ") + nitf_detail::printable(tag->getIdentifier()) + " (" +
+            std::to_string(tag->getDataLength()) + " bytes) runs past the end of the file; it is cut there";
+        vexo::nspio::Warning::Warn(message.c_str(), kSourceFile, __LINE__);
+        break;
+    }
+    for (CNitfLutSource* lut : m_luts) {
+        if (lut->getEntryOffset() + lut->getSize() <= size)
+            continue;
+        const std::string message = "The look-up table of image band " + std::to_string(lut->getBand()) +
+                                    " runs past the end of the file; what is missing reads as zeros";
+        vexo::nspio::Warning::Warn(message.c_str(), kSourceFile, __LINE__);
+        break;
+    }
 }
 
 // ---- writing

@@ -61,4 +61,22 @@ void reportError(const char* command, const std::string& file, const std::string
     std::fprintf(stderr, "nitf %s: %s: %s\n", command, file.c_str(), message.c_str());
 }
 
+WarningsOnStderr::WarningsOnStderr(const char* command, const std::string& file) {
+    m_previous =
+        vexo::nspio::Warning::setHandler([this, command, file](const char* message, const char*, int) {
+            std::lock_guard<std::mutex> lock(m_mutex);
+            if (m_seen.insert(message).second)
+                std::fprintf(stderr, "nitf %s: %s: warning: %s\n", command, file.c_str(), message);
+        });
+}
+
+WarningsOnStderr::~WarningsOnStderr() {
+    vexo::nspio::Warning::setHandler(m_previous);
+}
+
+int WarningsOnStderr::count() const {
+    std::lock_guard<std::mutex> lock(m_mutex);
+    return static_cast<int>(m_seen.size());
+}
+
 } // namespace cli

@@ -4,8 +4,12 @@
 
 #include <getopt.h>
 
+#include <mutex>
+#include <set>
 #include <string>
 #include <vector>
+
+#include "HostError.h"
 
 namespace cli {
 
@@ -67,5 +71,22 @@ private:
 
 // "nitf CMD: FILE: message" on stderr.
 void reportError(const char* command, const std::string& file, const std::string& message);
+
+// While it lives, the library's warnings go to stderr as "nitf CMD: FILE: warning: message", each once
+// (several decoding threads meet the same causes), and are counted.
+class WarningsOnStderr {
+public:
+    WarningsOnStderr(const char* command, const std::string& file);
+    ~WarningsOnStderr();
+    WarningsOnStderr(const WarningsOnStderr&) = delete;
+    WarningsOnStderr& operator=(const WarningsOnStderr&) = delete;
+
+    int count() const;
+
+private:
+    vexo::nspio::Warning::Handler m_previous;
+    mutable std::mutex m_mutex;
+    std::set<std::string> m_seen;
+};
 
 } // namespace cli
