@@ -189,9 +189,10 @@ protected:
     long long availableData() const { return m_availableData; }
     // Makes an empty tile offset table of blockEntryCount() entries (none for an unknown IMODE).
     void allocateTileOffsets();
-    // Fills the tile offset table from a block mask: entry i is mask entry i plus `start`, an absent entry
-    // (0xFFFFFFFF, or beyond the mask's `count` entries) stays absent.
-    void tileOffsetsFromMask(unsigned long long start, const unsigned int* blockMask, int count);
+    // The first step of every prepareTileOffsets: true when nothing is left to locate, because there is no
+    // table (an unknown IMODE) or because the block mask gave every entry (entry i is mask entry i plus
+    // `start`; an absent entry, 0xFFFFFFFF or beyond the mask's `count` entries, stays absent).
+    bool tileOffsetsFromMask(unsigned long long start, const unsigned int* blockMask, int count);
     // The entry of the tile offset table that holds band `band` of block (x, y), and the band's place in it.
     int blockEntry(int x, int y, int band) const;
     int bandInEntry(int band) const;

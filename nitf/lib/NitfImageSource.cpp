@@ -243,12 +243,17 @@ void CNitfImageSource::warnOnce(const char* cause, const std::string& message) {
     vexo::nspio::Warning::Warn(text.c_str(), kSourceFile, __LINE__);
 }
 
-void CNitfImageSource::tileOffsetsFromMask(unsigned long long start, const unsigned int* blockMask,
+bool CNitfImageSource::tileOffsetsFromMask(unsigned long long start, const unsigned int* blockMask,
                                            int count) {
-    for (int i = 0; m_tileOffsets && i < m_tileOffsetCount; ++i) {
+    if (!m_tileOffsets || m_tileOffsetCount == 0)
+        return true;
+    if (!blockMask)
+        return false;
+    for (int i = 0; i < m_tileOffsetCount; ++i) {
         const unsigned int offset = i < count ? blockMask[i] : 0xFFFFFFFFu;
         m_tileOffsets[i] = offset == 0xFFFFFFFFu ? kAbsentBlock : start + offset;
     }
+    return true;
 }
 
 CNitfImageSource::eBlockLayout_t CNitfImageSource::getBlockLayout() const {

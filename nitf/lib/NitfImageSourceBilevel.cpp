@@ -79,13 +79,9 @@ void CNitfImageSourceBilevel::readStart(FILE* fp, long long dataOffset, long lon
 
 void CNitfImageSourceBilevel::prepareTileOffsets(FILE* fp, long long dataOffset, long long,
                                                  unsigned int* blockMask, int count) {
+    if (tileOffsetsFromMask(static_cast<unsigned long long>(dataOffset), blockMask, count))
+        return;
     const int entries = m_tileOffsetCount;
-    if (!m_tileOffsets || entries == 0)
-        return;
-    if (blockMask) {
-        tileOffsetsFromMask(static_cast<unsigned long long>(dataOffset), blockMask, count);
-        return;
-    }
     // Without a mask the blocks follow one another, each ending with its RTC and padding to a whole byte:
     // only walking each block's coding finds where the next one begins. Blocks after a damaged one, or past
     // the end of the data, are absent.

@@ -111,13 +111,9 @@ std::vector<unsigned long long> CNitfImageSourceJpeg::findStreamStarts(FILE* fp,
 
 void CNitfImageSourceJpeg::prepareTileOffsets(FILE* fp, long long dataOffset, long long dataLength,
                                               unsigned int* blockMask, int count) {
+    if (tileOffsetsFromMask(static_cast<unsigned long long>(dataOffset), blockMask, count))
+        return;
     const int entries = m_tileOffsetCount;
-    if (!m_tileOffsets || entries == 0)
-        return;
-    if (blockMask) {
-        tileOffsetsFromMask(static_cast<unsigned long long>(dataOffset), blockMask, count);
-        return;
-    }
     // Streams follow each other in block order (band after band for IMODE S). A block whose stream is not
     // found reads as absent.
     const std::vector<unsigned long long> starts =

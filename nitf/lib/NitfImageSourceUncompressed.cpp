@@ -59,12 +59,8 @@ bool CNitfImageSourceUncompressed::isWriteable() {
 
 void CNitfImageSourceUncompressed::prepareTileOffsets(FILE*, long long dataOffset, long long,
                                                       unsigned int* blockMask, int count) {
-    if (!m_tileOffsets)
+    if (tileOffsetsFromMask(static_cast<unsigned long long>(dataOffset), blockMask, count))
         return;
-    if (blockMask) {
-        tileOffsetsFromMask(static_cast<unsigned long long>(dataOffset), blockMask, count);
-        return;
-    }
     const int entries = m_tileOffsetCount;
     // Stored one after the other: band-blocks for IMODE S (the blocks of each band follow the previous
     // band's), whole blocks otherwise. checkGeometry keeps these products within 2^62.

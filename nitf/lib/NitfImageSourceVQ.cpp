@@ -156,14 +156,10 @@ void CNitfImageSourceVQ::readCodebook(FILE* fp) {
 
 void CNitfImageSourceVQ::prepareTileOffsets(FILE*, long long blocksStart, long long, unsigned int* blockMask,
                                             int count) {
-    if (!m_tileOffsets)
+    const unsigned long long start = static_cast<unsigned long long>(blocksStart);
+    if (tileOffsetsFromMask(start, blockMask, count))
         return;
     const int entries = m_tileOffsetCount;
-    const unsigned long long start = static_cast<unsigned long long>(blocksStart);
-    if (blockMask) {
-        tileOffsetsFromMask(start, blockMask, count);
-        return;
-    }
     // Stored one after the other: each band-block for IMODE S, each block with all its bands for IMODE B.
     unsigned long long entryBytes = static_cast<unsigned long long>(m_indexBytesPerBlock);
     if (m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandInterleavedByBlock)
