@@ -15,6 +15,7 @@
 #include <vector>
 
 #include "BilevelStreams.h"
+#include "BenchProcess.h"
 #include "NitfFileReader.h"
 #include "NitfImageSource.h"
 #include "NitfSampleWriter.h"
@@ -74,25 +75,6 @@ const std::vector<BenchPage>& pages() {
     return list;
 }
 
-// Runs a program to its end, its output discarded; its exit status (-1 when it cannot be started).
-int run(const std::vector<std::string>& arguments) {
-    std::vector<char*> argv;
-    for (const std::string& argument : arguments)
-        argv.push_back(const_cast<char*>(argument.c_str()));
-    argv.push_back(nullptr);
-    posix_spawn_file_actions_t actions;
-    posix_spawn_file_actions_init(&actions);
-    posix_spawn_file_actions_addopen(&actions, 1, "/dev/null", O_WRONLY, 0);
-    posix_spawn_file_actions_addopen(&actions, 2, "/dev/null", O_WRONLY, 0);
-    pid_t pid;
-    const int started = posix_spawnp(&pid, argv[0], &actions, nullptr, argv.data(), environ);
-    posix_spawn_file_actions_destroy(&actions);
-    int status = 0;
-    if (started != 0 || waitpid(pid, &status, 0) < 0)
-        return -1;
-    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-}
-
 // Every block of the page decoded into one block buffer, the source made once.
 void decodeBlocks(benchmark::State& state, const BenchPage& page) {
     CNitfFileReader reader;
@@ -114,7 +96,7 @@ void decodeBlocks(benchmark::State& state, const BenchPage& page) {
 void wholeProcess(benchmark::State& state, const BenchPage& page, bool gdal) {
     if (page.path().empty())
         return state.SkipWithError("page not available");
-    if (gdal && run({"gdal_translate", "--version"}) != 0)
+    if (gdal && runQuietly({"gdal_translate", "--version"}) != 0)
         return state.SkipWithError("gdal_translate is not installed");
     const TempFile output(std::string(), gdal ? ".envi" : ".raw");
     const std::vector<std::string> command =
@@ -122,7 +104,7 @@ void wholeProcess(benchmark::State& state, const BenchPage& page, bool gdal) {
              : std::vector<std::string>{NITF_TOOL_PATH, "extract",     "-f",       "raw",
                                         "-o",           output.path(), page.path()};
     for (auto _ : state)
-        if (run(command) != 0)
+        if (runQuietly(command) != 0)
             return state.SkipWithError((command[0] + " cannot decode this page").c_str());
     state.SetBytesProcessed(state.iterations() * static_cast<int64_t>(output.read().size()));
     if (gdal) {

@@ -17,6 +17,7 @@
 #include <unistd.h>
 #include <vector>
 
+#include "BenchProcess.h"
 #include "NitfFileReader.h"
 #include "NitfImageSource.h"
 #include "TestFiles.h"
@@ -121,38 +122,18 @@ void VqSourceFrame(benchmark::State& state) {
     countPixels(state);
 }
 
-// Runs a program to completion; false when it cannot be started or fails.
-bool run(const std::vector<std::string>& arguments) {
-    std::vector<char*> argv;
-    for (const std::string& argument : arguments)
-        argv.push_back(const_cast<char*>(argument.c_str()));
-    argv.push_back(nullptr);
-    posix_spawn_file_actions_t actions;
-    posix_spawn_file_actions_init(&actions);
-    posix_spawn_file_actions_addopen(&actions, STDOUT_FILENO, "/dev/null", O_WRONLY, 0);
-    posix_spawn_file_actions_addopen(&actions, STDERR_FILENO, "/dev/null", O_WRONLY, 0);
-    pid_t pid;
-    const int started = posix_spawnp(&pid, argv[0], &actions, nullptr, argv.data(), environ);
-    posix_spawn_file_actions_destroy(&actions);
-    if (started != 0)
-        return false;
-    int status = 0;
-    waitpid(pid, &status, 0);
-    return WIFEXITED(status) && WEXITSTATUS(status) == 0;
-}
-
 void wholeProcess(benchmark::State& state, const std::vector<std::string>& command,
                   const std::string& output) {
     if (framePath().empty()) {
         state.SkipWithError("no test corpus");
         return;
     }
-    if (!run(command)) {
+    if (runQuietly(command) != 0) {
         state.SkipWithError(("cannot run " + command[0]).c_str());
         return;
     }
     for (auto _ : state) {
-        if (!run(command))
+        if (runQuietly(command) != 0)
             state.SkipWithError(("failed: " + command[0]).c_str());
     }
     std::remove(output.c_str());
