@@ -9,9 +9,7 @@
 #include <functional>
 #include <map>
 #include <memory>
-#include <spawn.h>
 #include <string>
-#include <sys/wait.h>
 #include <vector>
 
 #include "BilevelStreams.h"
@@ -21,7 +19,6 @@
 #include "NitfSampleWriter.h"
 #include "TestFiles.h"
 
-extern char** environ;
 
 namespace {
 

@@ -11,9 +11,7 @@
 #include <cstring>
 #include <fcntl.h>
 #include <memory>
-#include <spawn.h>
 #include <string>
-#include <sys/wait.h>
 #include <unistd.h>
 #include <vector>
 
@@ -23,7 +21,6 @@
 #include "TestFiles.h"
 #include "VqDecoder.h"
 
-extern char** environ;
 
 namespace {
 
