@@ -172,7 +172,8 @@ private:
         double fraction = 0;
         switch (m_view.kind) {
         case View::Bilevel:
-            return value != 0 ? 1 : 0;
+            // Bi-level images are delivered with a background of 0: paper white, marks black.
+            return value != 0 ? 0 : static_cast<unsigned>(top);
         case View::Scaled:
             fraction = value / (std::ldexp(1.0, m_view.significantBits) - 1);
             break;
@@ -221,10 +222,6 @@ PictureFormat pictureFormat(View& view, int width, int height, int bits, bool pn
     case View::Bilevel:
         // Black and white: one bit in a PNG, 0 and 255 in a PGM.
         format.depth = png ? 1 : 8;
-        if (!png) {
-            view.kind = View::Scaled;
-            view.significantBits = 1;
-        }
         break;
     case View::Scaled:
         format.depth = bits <= 8 ? 8 : 16;
