@@ -195,12 +195,6 @@ GeoReference geographic() {
     return geo;
 }
 
-// Skips the test when GDAL's Python bindings are not installed.
-#define GDAL_VIEW(view, paths)                                                                               \
-    std::optional<nlohmann::json> view = gdalView(paths);                                                    \
-    if (!view)                                                                                               \
-    GTEST_SKIP() << "GDAL's Python bindings (python3-gdal) are not installed"
-
 } // namespace
 
 TEST(GeoTiffWriter, EverySampleTypeInBothLayoutsReadsBackThroughGdal) {

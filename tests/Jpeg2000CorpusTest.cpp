@@ -1,7 +1,8 @@
-// Every JPEG 2000 image of the conformance corpus decodes through the JPEG 2000 source, block by block. Where
-// the manifest's reference pixels are exact (numerically lossless codestreams), the samples match them bit
-// for bit; elsewhere (lossy codestreams, where decoders may round differently) their statistics match within
-// a tolerance. Set NITF_J2K_PICTURES to a directory to get a picture of every image there.
+// The JPEG 2000 images of the conformance corpus that are not decoded exactly (those are checked with the
+// other exactly decoded images) decode through the JPEG 2000 source, block by block: where the reference
+// keeps negative samples on a second route, bit for bit; elsewhere (lossy codestreams, where decoders may
+// round differently) their statistics match within a tolerance. Set NITF_J2K_PICTURES to a directory to get a
+// picture of every image there.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -67,7 +68,7 @@ TEST(Jpeg2000Corpus, EveryJpeg2000ImageDecodes) {
     for (const CorpusFile& corpusFile : manifest.files()) {
         for (const nlohmann::json& image : corpusFile.entry->value("images", nlohmann::json::array())) {
             const std::string ic = image.value("IC", "");
-            if (ic != "C8" && ic != "M8")
+            if ((ic != "C8" && ic != "M8") || image.at("oracle").value("exact", false))
                 continue;
             const int index = image.at("index").get<int>();
             const std::string name = corpusFile.relative + " image " + std::to_string(index);
@@ -113,13 +114,6 @@ TEST(Jpeg2000Corpus, EveryJpeg2000ImageDecodes) {
                                 "band " + std::to_string(band) + " as RGB");
                 verdict = "close (RGB)";
                 ++close;
-            } else if (oracle.value("exact", false)) {
-                for (int band = 0; band < bands; ++band)
-                    EXPECT_EQ(Sha256::of(wholesamples::canonical(decoded, band, bytes)),
-                              oracle.at("bands").at(band).at("sha256"))
-                        << "band " << band;
-                verdict = "exact      ";
-                ++exact;
             } else {
                 for (int band = 0; band < bands; ++band)
                     expectClose(wholesamples::statsOf(decoded.bands[size_t(band)]),
@@ -131,7 +125,7 @@ TEST(Jpeg2000Corpus, EveryJpeg2000ImageDecodes) {
                       << statsText(wholesamples::statsOf(decoded.bands[0])) << "\n";
         }
     }
-    EXPECT_GE(images, 36);
+    EXPECT_GE(images, 20);
     std::cout << images << " JPEG 2000 images: " << exact << " exact, " << close << " within tolerance, "
               << unreferenced << " without reference pixels\n";
 }
@@ -161,10 +155,6 @@ bool readPgx(const std::string& path, Pgx& pgx) {
         pgx.samples.push_back(sign == '-' ? (bytesPerSample == 1 ? int8_t(v) : int16_t(v)) : int32_t(v));
     }
     return true;
-}
-
-bool haveCommand(const char* name) {
-    return std::system((std::string("command -v ") + name + " > /dev/null 2>&1").c_str()) == 0;
 }
 
 } // namespace

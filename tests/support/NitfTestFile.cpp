@@ -2,6 +2,12 @@
 
 #include <stdexcept>
 
+nitfsample::File fileOf(const nitfsample::Image& image) {
+    nitfsample::File file;
+    file.images = {image};
+    return file;
+}
+
 OpenedSample::OpenedSample(const nitfsample::File& file, const std::string& name)
     : m_file(new TempFile(nitfsample::build(file), "-" + name)) {
     if (!m_reader.open(m_file->path().c_str()))
@@ -11,4 +17,11 @@ OpenedSample::OpenedSample(const nitfsample::File& file, const std::string& name
 OpenedSample::OpenedSample(const std::string& bytes) : m_file(new TempFile(bytes)) {
     if (!m_reader.open(m_file->path().c_str()))
         throw std::runtime_error("cannot open " + m_file->path());
+}
+
+CNitfImageSource& OpenedSample::source(int index) {
+    std::unique_ptr<CNitfImageSource>& source = m_sources[index];
+    if (!source)
+        source.reset(m_reader.getNewImageSource(index));
+    return *source;
 }

@@ -6,6 +6,7 @@
 #include <sstream>
 #include <stdexcept>
 #include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include "HostFile.h"
@@ -66,14 +67,37 @@ std::string readWholeFile(const std::string& path) {
     return contents.str();
 }
 
-std::string runCommand(const std::string& command, int& status) {
+int runTool(const std::string& arguments, std::string* output) {
+    const std::string command = std::string(NITF_TOOL_PATH) + " 2>/dev/null " + arguments;
     FILE* pipe = popen(command.c_str(), "r");
     if (!pipe)
         throw std::runtime_error("cannot run " + command);
-    std::string output;
+    std::string text;
     char buffer[65536];
     for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, pipe)) > 0;)
-        output.append(buffer, got);
-    status = pclose(pipe);
-    return output;
+        text.append(buffer, got);
+    const int status = pclose(pipe);
+    if (output)
+        *output = text;
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+bool haveCommand(const std::string& name) {
+    return std::system(("command -v " + name + " >/dev/null 2>&1").c_str()) == 0;
+}
+
+CapturedWarnings::CapturedWarnings() {
+    m_previous = vexo::nspio::Warning::setHandler(
+        [this](const char* message, const char*, int) { m_messages.push_back(message); });
+}
+
+CapturedWarnings::~CapturedWarnings() {
+    vexo::nspio::Warning::setHandler(m_previous);
+}
+
+int CapturedWarnings::count(const std::string& part) const {
+    int n = 0;
+    for (const std::string& message : m_messages)
+        n += message.find(part) != std::string::npos;
+    return n;
 }

@@ -3,6 +3,9 @@
 
 #include <cstdio>
 #include <string>
+#include <vector>
+
+#include "HostError.h"
 
 // A file in the temporary directory, removed when the object goes.
 class TempFile {
@@ -44,5 +47,27 @@ std::string corpusRoot();
 // The whole contents of a file (empty when it cannot be read).
 std::string readWholeFile(const std::string& path);
 
-// Runs a shell command and returns its standard output; `status` receives its exit status (as from system()).
-std::string runCommand(const std::string& command, int& status);
+// Runs the nitf tool with `arguments` (the rest of a shell command line, which may redirect or pipe; standard
+// error is dropped unless they redirect it) and returns its exit status, -1 when it did not exit; `output`
+// receives its standard output.
+int runTool(const std::string& arguments, std::string* output = nullptr);
+
+// Whether a command of that name is installed.
+bool haveCommand(const std::string& name);
+
+// The library's warnings while it lives, collected instead of printed.
+class CapturedWarnings {
+public:
+    CapturedWarnings();
+    ~CapturedWarnings();
+    CapturedWarnings(const CapturedWarnings&) = delete;
+    CapturedWarnings& operator=(const CapturedWarnings&) = delete;
+
+    const std::vector<std::string>& messages() const { return m_messages; }
+    // How many of them contain `part`.
+    int count(const std::string& part) const;
+
+private:
+    std::vector<std::string> m_messages;
+    vexo::nspio::Warning::Handler m_previous;
+};
