@@ -6,13 +6,13 @@
 #include <cstdlib>
 #include <memory>
 #include <string>
-#include <unistd.h>
 
 #include "HostError.h"
 #include "HostFile.h"
 #include "NitfFileHeader.h"
 #include "NitfFileReader.h"
 #include "NitfImageSubheader.h"
+#include "TestFiles.h"
 
 namespace {
 
@@ -49,19 +49,14 @@ void writeBack(CNitfFileHeader& header, FILE* in) {
 } // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-    static const std::string path = "/tmp/nitf-fuzz-record-" + std::to_string(getpid()) + ".ntf";
-    FILE* file = std::fopen(path.c_str(), "wb");
-    if (!file)
-        return 0;
-    std::fwrite(data, 1, size, file);
-    std::fclose(file);
+    static const TempFile file;
+    file.write(std::string(reinterpret_cast<const char*>(data), size));
     try {
         CNitfFileReader reader;
-        if (reader.open(path.c_str()))
+        if (reader.open(file.path().c_str()))
             writeBack(*reader.getFileHeader(), reader.getInputStream());
     } catch (const vexo::Exception&) {
         // Refused: a number that does not fit its field, a damaged structure.
     }
-    std::remove(path.c_str());
     return 0;
 }

@@ -13,35 +13,16 @@
 #include "NitfImagePropertiesIF.h"
 #include "NitfImageSource.h"
 #include "NitfImageSourceUncompressed.h"
-#include "NitfSampleWriter.h"
-#include "TestFiles.h"
+#include "NitfTestFile.h"
 
 namespace {
 
 using nitfsample::Image;
 
-// A one-image file on disk, opened, with the image's source.
-struct OpenImage {
-    explicit OpenImage(const Image& image) : OpenImage(bytesOf(image)) {}
-    explicit OpenImage(const std::string& bytes) : file(bytes) {
-        if (!reader.open(file.path().c_str()))
-            throw std::runtime_error("cannot open " + file.path());
-        source.reset(reader.getNewImageSource(0));
-    }
-    static std::string bytesOf(const Image& image) {
-        nitfsample::File file;
-        file.images = {image};
-        return nitfsample::build(file);
-    }
-    CNitfImageSourceUncompressed& uncompressed() {
-        return dynamic_cast<CNitfImageSourceUncompressed&>(*source);
-    }
-    std::string band(int band) { return canonicalBand(reader, *source, band); }
-
-    TempFile file;
-    CNitfFileReader reader;
-    std::unique_ptr<CNitfImageSource> source;
-};
+// One band of a sample's image 0 in canonical form.
+std::string bandOf(OpenedSample& open, int band) {
+    return canonicalBand(open.reader(), open.source(), band);
+}
 
 // 37 x 29 pixels in 16 x 8 blocks: partial blocks at the right and the bottom.
 Image blockedImage(char imode, int nbpp, int bands) {
@@ -107,9 +88,9 @@ TEST(ImageSourceRoundTrip, EveryInterleavingAndDepthDecodesToTheWrittenSamples) 
                 SCOPED_TRACE(std::string("IMODE ") + imode + ", NBPP " + std::to_string(nbpp) + ", " +
                              std::to_string(bands) + " band(s)");
                 Image image = blockedImage(imode, nbpp, bands);
-                OpenImage open(image);
+                OpenedSample open(image);
                 for (int band = 0; band < bands; ++band)
-                    EXPECT_EQ(open.band(band), nitfsample::canonicalBand(image, band)) << "band " << band;
+                    EXPECT_EQ(bandOf(open, band), nitfsample::canonicalBand(image, band)) << "band " << band;
             }
         }
     }
@@ -119,12 +100,12 @@ TEST(ImageSourceRoundTrip, InterleavedBlocksAndWiderRowsHoldTheSameSamples) {
     for (char imode : {'B', 'S', 'P'}) {
         SCOPED_TRACE(std::string("IMODE ") + imode);
         Image image = blockedImage(imode, 16, 3);
-        OpenImage open(image);
-        CNitfImagePropertiesIF& p = open.source->getImageProperties();
+        OpenedSample open(image);
+        CNitfImagePropertiesIF& p = open.source().getImageProperties();
         // Block (1, 2) pixel-interleaved: sample (r, c, k) at ((r * 16 + c) * 3 + k) * 2, big-endian.
         std::vector<unsigned char> block(static_cast<size_t>(p.getTileBufferSize()));
         ASSERT_TRUE(
-            open.source->readTileInterleaved(&open.reader, reinterpret_cast<char*>(block.data()), 1, 2));
+            open.source().readTileInterleaved(&open.reader(), reinterpret_cast<char*>(block.data()), 1, 2));
         for (int r : {0, 7})
             for (int c : {0, 4})
                 for (int k = 0; k < 3; ++k) {
@@ -133,13 +114,13 @@ TEST(ImageSourceRoundTrip, InterleavedBlocksAndWiderRowsHoldTheSameSamples) {
                 }
         // One band into rows wider than stored: the gaps are left alone.
         std::vector<unsigned char> wide(8 * 40, 0xEE);
-        ASSERT_TRUE(open.source->readTileNonInterleaved(&open.reader, reinterpret_cast<char*>(wide.data()),
-                                                        40, 1, 0, 2));
+        ASSERT_TRUE(open.source().readTileNonInterleaved(&open.reader(), reinterpret_cast<char*>(wide.data()),
+                                                         40, 1, 0, 2));
         EXPECT_EQ(wide[40 * 3 + 2 * 5] << 8 | wide[40 * 3 + 2 * 5 + 1],
                   nitfsample::sampleAt(image, 2, 3, 16 + 5));
         EXPECT_EQ(wide[39], 0xEE);
-        EXPECT_THROW(open.source->readTileNonInterleaved(&open.reader, reinterpret_cast<char*>(wide.data()),
-                                                         31, 1, 0, 2),
+        EXPECT_THROW(open.source().readTileNonInterleaved(&open.reader(),
+                                                          reinterpret_cast<char*>(wide.data()), 31, 1, 0, 2),
                      vexo::Exception)
             << "rows narrower than a block row";
     }
@@ -152,31 +133,36 @@ TEST(ImageSourceLayout, BlockOffsetsFollowTheInterleaving) {
     sequential.nppbh = sequential.nppbv = 4;
     sequential.bands = 3;
     sequential.imode = 'S';
-    OpenImage s(sequential);
-    const unsigned long long start = s.uncompressed().getTileOffset(0);
-    EXPECT_EQ(s.uncompressed().getTileOffset(1, 0, 2), s.uncompressed().getTileOffset(9));
-    EXPECT_EQ(s.uncompressed().getTileOffset(1, 0, 2), start + 9 * 16);
-    EXPECT_EQ(s.uncompressed().getTileOffset(2, 0, 0), CNitfImageSource::kAbsentBlock) << "no such block";
-    EXPECT_EQ(s.uncompressed().getTileOffset(0, 0, 3), CNitfImageSource::kAbsentBlock) << "no such band";
-    EXPECT_EQ(s.uncompressed().getTileOffset(12), 0u) << "outside the table";
+    OpenedSample s(sequential);
+    const unsigned long long start = s.source<CNitfImageSourceUncompressed>().getTileOffset(0);
+    EXPECT_EQ(s.source<CNitfImageSourceUncompressed>().getTileOffset(1, 0, 2),
+              s.source<CNitfImageSourceUncompressed>().getTileOffset(9));
+    EXPECT_EQ(s.source<CNitfImageSourceUncompressed>().getTileOffset(1, 0, 2), start + 9 * 16);
+    EXPECT_EQ(s.source<CNitfImageSourceUncompressed>().getTileOffset(2, 0, 0), CNitfImageSource::kAbsentBlock)
+        << "no such block";
+    EXPECT_EQ(s.source<CNitfImageSourceUncompressed>().getTileOffset(0, 0, 3), CNitfImageSource::kAbsentBlock)
+        << "no such band";
+    EXPECT_EQ(s.source<CNitfImageSourceUncompressed>().getTileOffset(12), 0u) << "outside the table";
 
     // Band-interleaved by block: band 2 of block (1, 0) lies two band-blocks into the block.
     sequential.imode = 'B';
-    OpenImage b(sequential);
-    EXPECT_EQ(b.uncompressed().getTileOffset(1, 0, 2), start + 1 * 48 + 2 * 16);
+    OpenedSample b(sequential);
+    EXPECT_EQ(b.source<CNitfImageSourceUncompressed>().getTileOffset(1, 0, 2), start + 1 * 48 + 2 * 16);
     // Pixel- and row-interleaved: one offset per block whatever the band.
     sequential.imode = 'R';
-    OpenImage r(sequential);
-    EXPECT_EQ(r.uncompressed().getTileOffset(1, 1, 2), start + 3 * 48);
+    OpenedSample r(sequential);
+    EXPECT_EQ(r.source<CNitfImageSourceUncompressed>().getTileOffset(1, 1, 2), start + 3 * 48);
 
     // 3 x 3 blocks of 4 bits hold 4.5 bytes: each block takes 5.
     Image odd;
     odd.cols = odd.rows = 6;
     odd.nppbh = odd.nppbv = 3;
     odd.nbpp = 4;
-    OpenImage o(odd);
-    EXPECT_EQ(o.uncompressed().getTileOffset(1, 0, 0) - o.uncompressed().getTileOffset(0, 0, 0), 5u);
-    EXPECT_EQ(o.band(0), nitfsample::canonicalBand(odd, 0));
+    OpenedSample o(odd);
+    EXPECT_EQ(o.source<CNitfImageSourceUncompressed>().getTileOffset(1, 0, 0) -
+                  o.source<CNitfImageSourceUncompressed>().getTileOffset(0, 0, 0),
+              5u);
+    EXPECT_EQ(bandOf(o, 0), nitfsample::canonicalBand(odd, 0));
 }
 
 TEST(ImageSourceMasked, AbsentBlocksReadAsZerosAndTheMaskIsMeasured) {
@@ -189,17 +175,17 @@ TEST(ImageSourceMasked, AbsentBlocksReadAsZerosAndTheMaskIsMeasured) {
         image.padBlocks = {2};
         image.padCodeBits = 8;
         image.padValue = 0x7F;
-        OpenImage open(image);
-        CNitfImageSourceUncompressed& source = open.uncompressed();
+        OpenedSample open(image);
+        CNitfImageSourceUncompressed& source = open.source<CNitfImageSourceUncompressed>();
         for (int band = 0; band < 3; ++band)
-            EXPECT_EQ(open.band(band), nitfsample::canonicalBand(image, band)) << "band " << band;
+            EXPECT_EQ(bandOf(open, band), nitfsample::canonicalBand(image, band)) << "band " << band;
         EXPECT_EQ(source.getTileOffset(1), CNitfImageSource::kAbsentBlock);
         EXPECT_TRUE(source.hasPadPixel());
         EXPECT_EQ(source.getPadPixelValue(), 0x7F);
         const int entries = nitfsample::blockEntryCount(image);
         EXPECT_EQ(source.computeBlockMaskStorageLength(), 10 + 4 * entries);
         // The blocks start after the whole record: both masks and the pad code.
-        CNitfHeaderDataPair* pair = open.reader.getFileHeader()->getImageHeaderDataPair(0);
+        CNitfHeaderDataPair* pair = open.reader().getFileHeader()->getImageHeaderDataPair(0);
         EXPECT_EQ(source.getTileOffset(0),
                   static_cast<unsigned long long>(pair->getDataOffset() + 10 + 1 + 8 * entries));
 
@@ -207,7 +193,7 @@ TEST(ImageSourceMasked, AbsentBlocksReadAsZerosAndTheMaskIsMeasured) {
         std::vector<char> rows(8 * 20, 'x');
         if (imode != 'P') {
             ASSERT_TRUE(
-                source.readTileNonInterleaved(&open.reader, rows.data(), 20, 1, 0, imode == 'S' ? 0 : 1));
+                source.readTileNonInterleaved(&open.reader(), rows.data(), 20, 1, 0, imode == 'S' ? 0 : 1));
             EXPECT_EQ(rows[0], 0);
             EXPECT_EQ(rows[15], 0);
             EXPECT_EQ(rows[16], 'x');
@@ -219,10 +205,10 @@ TEST(ImageSourceMasked, AbsentBlocksReadAsZerosAndTheMaskIsMeasured) {
     plain.ic = "NM";
     plain.blockMaskRecords = false;
     plain.padMaskRecords = true;
-    OpenImage open(plain);
-    EXPECT_FALSE(open.source->hasPadPixel());
-    EXPECT_EQ(open.source->computeBlockMaskStorageLength(), 0);
-    EXPECT_EQ(open.band(0), nitfsample::canonicalBand(plain, 0));
+    OpenedSample open(plain);
+    EXPECT_FALSE(open.source().hasPadPixel());
+    EXPECT_EQ(open.source().computeBlockMaskStorageLength(), 0);
+    EXPECT_EQ(bandOf(open, 0), nitfsample::canonicalBand(plain, 0));
 }
 
 TEST(ImageSourceMasked, PadPixelIsDecodedByPixelValueType) {
@@ -257,20 +243,20 @@ TEST(ImageSourceMasked, PadPixelIsDecodedByPixelValueType) {
         image.nbpp = c.nbpp;
         image.padCodeBits = c.codeBits;
         image.padValue = c.code;
-        OpenImage open(image);
-        EXPECT_EQ(open.source->hasPadPixel(), c.has);
-        EXPECT_EQ(open.source->getPadPixelValue(), c.value);
+        OpenedSample open(image);
+        EXPECT_EQ(open.source().hasPadPixel(), c.has);
+        EXPECT_EQ(open.source().getPadPixelValue(), c.value);
     }
 }
 
 TEST(ImageSourceBlockCache, PixelInterleavedBlocksAreReadOncePerVisit) {
     Image image = blockedImage('P', 8, 3);
-    OpenImage open(image);
-    CountingFile counting(open.file.read());
-    const long long block = open.source->getImageProperties().getTileBufferSize();
+    OpenedSample open(image);
+    CountingFile counting(readWholeFile(open.path()));
+    const long long block = open.source().getImageProperties().getTileBufferSize();
     std::vector<char> buffer(static_cast<size_t>(block));
     auto read = [&](int band, int x, int y) {
-        EXPECT_TRUE(open.source->readTileNonInterleaved(&counting, buffer.data(), band, x, y));
+        EXPECT_TRUE(open.source().readTileNonInterleaved(&counting, buffer.data(), band, x, y));
         return nitfsample::sampleAt(image, band, y * 8 + 1, x * 16 + 2) ==
                static_cast<unsigned char>(buffer[16 + 2]);
     };
@@ -284,10 +270,10 @@ TEST(ImageSourceBlockCache, PixelInterleavedBlocksAreReadOncePerVisit) {
 
     // Band-interleaved by block: each band reads its own bytes and no others.
     Image byBlock = blockedImage('B', 8, 3);
-    OpenImage b(byBlock);
-    CountingFile direct(b.file.read());
+    OpenedSample b(byBlock);
+    CountingFile direct(readWholeFile(b.path()));
     for (int band = 0; band < 3; ++band)
-        ASSERT_TRUE(b.source->readTileNonInterleaved(&direct, buffer.data(), band, 1, 1));
+        ASSERT_TRUE(b.source().readTileNonInterleaved(&direct, buffer.data(), band, 1, 1));
     EXPECT_EQ(direct.bytesRead, 3 * 16 * 8);
 }
 
@@ -314,10 +300,10 @@ TEST(ImageSourceBitmap, RowsAreSampledAndAPadOfOneInvertsThem) {
             image.padValue = 1;
             image.absentBlocks = {4}; // block (1, 1): rows 4-7, columns 8-15
         }
-        OpenImage open(image);
+        OpenedSample open(image);
         // Columns 3-15, 8 source rows onto 4 output rows (rows 1, 3, 5, 7), 16 bits per output row.
         std::vector<unsigned char> out(8, 0x5A);
-        ASSERT_TRUE(open.source->readBitmap(reinterpret_cast<char*>(out.data()), 3, 1, 13, 8, 16, 4));
+        ASSERT_TRUE(open.source().readBitmap(reinterpret_cast<char*>(out.data()), 3, 1, 13, 8, 16, 4));
         for (int i = 0; i < 4; ++i) {
             const int row = 1 + 2 * i;
             for (int c = 0; c < 16; ++c) {
@@ -328,9 +314,9 @@ TEST(ImageSourceBitmap, RowsAreSampledAndAPadOfOneInvertsThem) {
                     << "row " << i << " bit " << c;
             }
         }
-        EXPECT_FALSE(open.source->readBitmap(reinterpret_cast<char*>(out.data()), 20, 0, 8, 4, 8, 4))
+        EXPECT_FALSE(open.source().readBitmap(reinterpret_cast<char*>(out.data()), 20, 0, 8, 4, 8, 4))
             << "beyond the padded width";
-        EXPECT_FALSE(open.source->readBitmap(reinterpret_cast<char*>(out.data()), 0, 9, 8, 8, 8, 4))
+        EXPECT_FALSE(open.source().readBitmap(reinterpret_cast<char*>(out.data()), 0, 9, 8, 8, 8, 4))
             << "rows beyond the image";
     }
 }
@@ -361,33 +347,26 @@ TEST(ImageSourceInterleaving, ConversionsMoveWholeSamplesAndRowToBandPacksRows) 
     EXPECT_EQ(std::string(packed.data(), 8), "AABB----");
 }
 
-TEST(ImageSource, WriteabilityLevelsTypesAndMessages) {
-    struct Case {
+TEST(ImageSource, WriteabilityLevelsAndTypes) {
+    const struct {
         char imode;
         int bands;
         bool writeable;
     } cases[] = {{'P', 3, false}, {'P', 1, true}, {'B', 3, true}, {'S', 3, true}, {'R', 3, true}};
-    for (const Case& c : cases) {
+    for (const auto& c : cases) {
         Image image;
         image.imode = c.imode;
         image.bands = c.bands;
-        OpenImage open(image);
-        EXPECT_EQ(open.source->isWriteable(), c.writeable) << c.imode << " " << c.bands;
+        EXPECT_EQ(OpenedSample(image).source().isWriteable(), c.writeable) << c.imode << " " << c.bands;
     }
-
     Image image;
     image.idlvl = 2;
     image.ialvl = 1;
     image.pvtype = "si";
     image.nbpp = 16;
-    OpenImage open(image);
-    EXPECT_EQ(open.source->getDisplayLevel(), 2);
-    EXPECT_EQ(open.source->getAttachmentLevel(), 2) << "the display level, not IALVL";
-    EXPECT_EQ(open.source->getPvtype(), CNitfImagePropertiesIF::ePVTypeSignedInteger);
-    char* message = open.source->getErrorMessage(42);
-    EXPECT_STREQ(message, "NITF Image error");
-    free(message);
-    EXPECT_EQ(open.source->GetChanIndex(), -1);
+    OpenedSample open(image);
+    EXPECT_EQ(open.source().getAttachmentLevel(), 2) << "the display level, not IALVL";
+    EXPECT_EQ(open.source().getPvtype(), CNitfImagePropertiesIF::ePVTypeSignedInteger);
 }
 
 TEST(ImageProperties, BufferSizesFollowTheTwelveBitJpegRule) {
@@ -395,13 +374,8 @@ TEST(ImageProperties, BufferSizesFollowTheTwelveBitJpegRule) {
     image.cols = 100;
     image.rows = 30;
     image.nbpp = 12;
-    nitfsample::File file;
-    file.images = {image};
-    TempFile tmp(nitfsample::build(file));
-    CNitfFileReader reader;
-    ASSERT_TRUE(reader.open(tmp.path().c_str()));
-    std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(0));
-    CNitfImagePropertiesIF& p = source->getImageProperties();
+    OpenedSample twelve(image);
+    CNitfImagePropertiesIF& p = twelve.source().getImageProperties();
     EXPECT_EQ(p.getTileBandWidthBufferSize(), 150);
     p.setCompressionType(CNitfImagePropertiesIF::eCompressionJpeg);
     EXPECT_EQ(p.getTileBandWidthBufferSize(), 200) << "12-bit JPEG samples take two bytes";
@@ -410,11 +384,7 @@ TEST(ImageProperties, BufferSizesFollowTheTwelveBitJpegRule) {
     image.cols = 1000;
     image.nbpp = 1;
     image.pvtype = "B";
-    file.images = {image};
-    tmp.write(nitfsample::build(file));
-    CNitfFileReader bilevel;
-    ASSERT_TRUE(bilevel.open(tmp.path().c_str()));
-    source.reset(bilevel.getNewImageSource(0));
-    EXPECT_EQ(source->getImageProperties().getTileBandWidthBufferSize(), 125);
-    EXPECT_EQ(source->getImageProperties().getTileBandBufferSize(), 3750);
+    OpenedSample bilevel(image);
+    EXPECT_EQ(bilevel.source().getImageProperties().getTileBandWidthBufferSize(), 125);
+    EXPECT_EQ(bilevel.source().getImageProperties().getTileBandBufferSize(), 3750);
 }

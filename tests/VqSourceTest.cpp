@@ -13,61 +13,13 @@
 #include "HostError.h"
 #include "NitfFileReader.h"
 #include "NitfImageSourceVQ.h"
-#include "NitfSampleWriter.h"
-#include "TestFiles.h"
+#include "NitfTestFile.h"
 #include "VqDecoder.h"
+#include "VqStreams.h"
+
+using vqtest::Layout;
 
 namespace {
-
-// The code grid of a block and how the image data describe it.
-struct Layout {
-    int codesPerRow = 8;
-    int codeRows = 8;
-    int bits = 12;
-    int kernelWidth = 4;
-    int kernelHeight = 4;
-    bool withGrid = true; // the header starts with the code grid (the image display parameters)
-    int blockWidth() const { return codesPerRow * kernelWidth; }
-    int blockHeight() const { return codeRows * kernelHeight; }
-    size_t indexBytes() const { return static_cast<size_t>(codesPerRow) * codeRows * bits / 8; }
-};
-
-void putBigEndian(std::string& out, uint64_t value, int bytes) {
-    for (int i = bytes - 1; i >= 0; --i)
-        out += static_cast<char>((value >> (8 * i)) & 0xFF);
-}
-
-// The pixels of kernel `code` of the tests' codebook.
-unsigned char kernelPixel(int code, int row, int col) {
-    return static_cast<unsigned char>(code * 13 + (code >> 8) + row * 5 + col * 3);
-}
-
-// The header and the codebook: kernel-height tables of 2^bits records of kernel-width bytes.
-std::string headerAndCodebook(const Layout& layout, int lookupRecords = 4) {
-    std::string out;
-    if (layout.withGrid) {
-        putBigEndian(out, layout.codeRows, 4);
-        putBigEndian(out, layout.codesPerRow, 4);
-        putBigEndian(out, layout.bits, 1);
-    }
-    putBigEndian(out, 1, 2); // vector quantisation
-    putBigEndian(out, lookupRecords, 2);
-    putBigEndian(out, 0, 2);
-    putBigEndian(out, 6, 4);
-    putBigEndian(out, 14, 2);
-    for (int id = 1; id <= lookupRecords; ++id) {
-        putBigEndian(out, id, 2);
-        putBigEndian(out, 1u << layout.bits, 4);
-        putBigEndian(out, layout.kernelWidth, 2);
-        putBigEndian(out, 8, 2);
-        putBigEndian(out, 0, 4); // never followed
-    }
-    for (int row = 0; row < layout.kernelHeight; ++row)
-        for (int code = 0; code < (1 << layout.bits); ++code)
-            for (int col = 0; col < layout.kernelWidth; ++col)
-                out += static_cast<char>(kernelPixel(code, row, col));
-    return out;
-}
 
 // The codes of block entry `entry`, varied from block to block.
 std::vector<int> codesOf(const Layout& layout, int entry) {
@@ -82,18 +34,6 @@ std::vector<int> codesOf(const Layout& layout, int entry) {
     return codes;
 }
 
-// The codes packed most significant bit first, cut to the block's whole index bytes.
-std::string packed(const Layout& layout, const std::vector<int>& codes) {
-    std::string bytes((codes.size() * layout.bits + 7) / 8, '\0');
-    size_t bit = 0;
-    for (int code : codes)
-        for (int i = layout.bits - 1; i >= 0; --i, ++bit)
-            if ((code >> i) & 1)
-                bytes[bit / 8] = static_cast<char>(bytes[bit / 8] | (0x80 >> (bit % 8)));
-    bytes.resize(layout.indexBytes());
-    return bytes;
-}
-
 // The pixels a block of these codes decodes to, rows of block width.
 std::vector<unsigned char> expectedBlock(const Layout& layout, int entry) {
     const std::vector<int> codes = codesOf(layout, entry);
@@ -103,7 +43,7 @@ std::vector<unsigned char> expectedBlock(const Layout& layout, int entry) {
             const int code = codes[static_cast<size_t>(y / layout.kernelHeight) * layout.codesPerRow +
                                    x / layout.kernelWidth];
             pixels[static_cast<size_t>(y) * layout.blockWidth() + x] =
-                kernelPixel(code, y % layout.kernelHeight, x % layout.kernelWidth);
+                vqtest::kernelPixel(code, y % layout.kernelHeight, x % layout.kernelWidth);
         }
     return pixels;
 }
@@ -120,48 +60,33 @@ nitfsample::Image vqImage(const Layout& layout, int blocksX, int blocksY, int ba
     image.nppbv = layout.blockHeight();
     image.cols = blocksX * image.nppbh;
     image.rows = blocksY * image.nppbv;
-    std::string data = headerAndCodebook(layout);
+    std::string data = vqtest::headerAndCodebook(layout);
     for (int entry = 0; entry < blocksX * blocksY * bands; ++entry)
-        data += packed(layout, codesOf(layout, entry));
+        data += vqtest::packed(layout, codesOf(layout, entry));
     image.blockData = {data};
     return image;
 }
 
-std::string fileWith(const nitfsample::Image& image) {
-    nitfsample::File file;
-    file.images = {image};
-    return nitfsample::build(file);
+// Block (x, y) of a band, as many bytes as the source asks for, 0xEE beyond what it writes.
+std::vector<unsigned char> blockOf(OpenedSample& image, int x, int y, int band = 0, bool* present = nullptr) {
+    const CNitfImagePropertiesIF& p = image.source().getImageProperties();
+    std::vector<unsigned char> pixels(static_cast<size_t>(p.getTileBandReadBufferSize()), 0xEE);
+    const bool read = image.source().readTileNonInterleaved(
+        &image.reader(), reinterpret_cast<char*>(pixels.data()), p.getTileWidth(), x, y, band);
+    if (present)
+        *present = read;
+    return pixels;
 }
 
-struct OpenImage {
-    explicit OpenImage(const std::string& bytes) : file(bytes) {
-        if (!reader.open(file.path().c_str()))
-            throw std::runtime_error("cannot open");
-        source.reset(reader.getNewImageSource(0));
-    }
-    std::vector<unsigned char> block(int x, int y, int band = 0, bool* present = nullptr) {
-        const CNitfImagePropertiesIF& p = source->getImageProperties();
-        std::vector<unsigned char> pixels(static_cast<size_t>(p.getTileBandReadBufferSize()), 0xEE);
-        const bool read = source->readTileNonInterleaved(&reader, reinterpret_cast<char*>(pixels.data()),
-                                                         p.getTileWidth(), x, y, band);
-        if (present)
-            *present = read;
-        return pixels;
-    }
-    TempFile file;
-    CNitfFileReader reader;
-    std::unique_ptr<CNitfImageSource> source;
-};
-
 // Opens image 0 and reads every block band; the exception's message, or "" when all went through.
-std::string readEverything(const std::string& bytes) {
+std::string readEverything(const nitfsample::Image& vq) {
     try {
-        OpenImage image(bytes);
-        const CNitfImagePropertiesIF& p = image.source->getImageProperties();
+        OpenedSample image(vq);
+        const CNitfImagePropertiesIF& p = image.source().getImageProperties();
         for (int band = 0; band < p.getBandCount(); ++band)
             for (int y = 0; y < p.getTileCountY(); ++y)
                 for (int x = 0; x < p.getTileCountX(); ++x)
-                    image.block(x, y, band);
+                    blockOf(image, x, y, band);
     } catch (const vexo::Exception& e) {
         return e.what();
     }
@@ -189,11 +114,11 @@ TEST(VqDecoder, EveryCodeLengthAndKernelSizeDecodesItsKernels) {
                      std::to_string(c.kernelHeight));
         CVqDecoder decoder(c.codesPerRow, c.codeRows, c.bits, c.kernelWidth, c.kernelHeight);
         ASSERT_EQ(decoder.indexBytes(), layout.indexBytes());
-        std::string book = headerAndCodebook(layout);
+        std::string book = vqtest::headerAndCodebook(layout);
         book.erase(0, book.size() - decoder.codebookBytes());
         decoder.setCodebook(reinterpret_cast<const unsigned char*>(book.data()));
         std::string indexes =
-            packed(layout, codesOf(layout, 3)) + std::string(CVqDecoder::kIndexPadding, '\0');
+            vqtest::packed(layout, codesOf(layout, 3)) + std::string(CVqDecoder::kIndexPadding, '\0');
         // Lines wider than the block: what lies right of it stays as it was.
         const int line = layout.blockWidth() + 5;
         std::vector<unsigned char> out(static_cast<size_t>(line) * layout.blockHeight(), 0xEE);
@@ -219,9 +144,8 @@ TEST(VqSource, BlocksDecodeWithAndWithoutTheCodeGrid) {
     eightBit.kernelHeight = 3;
     for (const Layout& layout : {withGrid, withoutGrid, eightBit}) {
         SCOPED_TRACE(std::to_string(layout.bits) + " bits, grid " + (layout.withGrid ? "given" : "implied"));
-        OpenImage image(fileWith(vqImage(layout, 2, 2)));
-        auto* vq = dynamic_cast<CNitfImageSourceVQ*>(image.source.get());
-        ASSERT_NE(vq, nullptr);
+        OpenedSample image(vqImage(layout, 2, 2));
+        auto* vq = &image.source<CNitfImageSourceVQ>();
         EXPECT_EQ(vq->getCodeBitLength(), layout.bits);
         EXPECT_EQ(vq->getCodesPerRow(), layout.codesPerRow);
         EXPECT_EQ(vq->getKernelWidth(), layout.kernelWidth);
@@ -229,16 +153,16 @@ TEST(VqSource, BlocksDecodeWithAndWithoutTheCodeGrid) {
         EXPECT_EQ(vq->getIndexBytesPerBlock(), static_cast<int>(layout.indexBytes()));
         for (int entry = 0; entry < 4; ++entry) {
             bool present = false;
-            std::vector<unsigned char> pixels = image.block(entry % 2, entry / 2, 0, &present);
+            std::vector<unsigned char> pixels = blockOf(image, entry % 2, entry / 2, 0, &present);
             EXPECT_TRUE(present);
             pixels.resize(static_cast<size_t>(layout.blockWidth()) * layout.blockHeight());
             EXPECT_EQ(pixels, expectedBlock(layout, entry)) << "block " << entry;
         }
         // Outside the image: nothing read.
         bool present = true;
-        image.block(2, 0, 0, &present);
+        blockOf(image, 2, 0, 0, &present);
         EXPECT_FALSE(present);
-        image.block(0, 0, 1, &present);
+        blockOf(image, 0, 0, 1, &present);
         EXPECT_FALSE(present);
     }
 }
@@ -248,19 +172,19 @@ TEST(VqSource, TwoBandsBandSequentialAndByBlock) {
     const size_t blockPixels = static_cast<size_t>(layout.blockWidth()) * layout.blockHeight();
     for (char imode : {'S', 'B'}) {
         SCOPED_TRACE(std::string("IMODE ") + imode);
-        OpenImage image(fileWith(vqImage(layout, 2, 1, 2, imode)));
+        OpenedSample image(vqImage(layout, 2, 1, 2, imode));
         // Entries in file order: S holds band 0's blocks then band 1's; B holds each block's bands together.
         auto entryOf = [&](int x, int band) { return imode == 'S' ? band * 2 + x : x * 2 + band; };
         for (int x = 0; x < 2; ++x)
             for (int band = 0; band < 2; ++band) {
-                std::vector<unsigned char> pixels = image.block(x, 0, band);
+                std::vector<unsigned char> pixels = blockOf(image, x, 0, band);
                 pixels.resize(blockPixels);
                 EXPECT_EQ(pixels, expectedBlock(layout, entryOf(x, band))) << x << "," << band;
             }
         // Both bands at once, pixel-interleaved.
         std::vector<char> both(2 * blockPixels);
         ASSERT_TRUE(
-            image.source->readTileInterleaved(&image.reader, both.data(), 2 * layout.blockWidth(), 1, 0));
+            image.source().readTileInterleaved(&image.reader(), both.data(), 2 * layout.blockWidth(), 1, 0));
         const std::vector<unsigned char> band0 = expectedBlock(layout, entryOf(1, 0));
         const std::vector<unsigned char> band1 = expectedBlock(layout, entryOf(1, 1));
         for (size_t i = 0; i < blockPixels; ++i) {
@@ -277,10 +201,8 @@ TEST(VqSource, StorageLengthsOfTheWrittenForm) {
     frame.rows = frame.cols = 1536;
     frame.nppbh = frame.nppbv = 256;
     frame.blockData = {std::string(100, '\0')};
-    TempFile file(fileWith(frame));
-    CNitfFileReader reader;
-    ASSERT_TRUE(reader.open(file.path().c_str()));
-    CNitfImageSourceVQ source(reader.getFileHeader()->getNewImageSubheader(reader.getInputStream(), 0),
+    OpenedSample file(frame);
+    CNitfImageSourceVQ source(file.header()->getNewImageSubheader(file.reader().getInputStream(), 0),
                               nullptr);
     EXPECT_EQ(source.computeVqIndexesPerTileLength(), 6144);
     EXPECT_EQ(source.computeVqIndexesLength(), 36 * 6144);
@@ -311,22 +233,21 @@ TEST(VqSource, DamagedHeadersAreRefusedWithAClearMessage) {
         SCOPED_TRACE(c.what);
         nitfsample::Image image = good;
         image.blockData[0].replace(c.at, c.bytes.size(), c.bytes);
-        EXPECT_NE(readEverything(fileWith(image)).find(c.message), std::string::npos)
-            << readEverything(fileWith(image));
+        EXPECT_NE(readEverything(image).find(c.message), std::string::npos) << readEverything(image);
     }
     // A codebook cut short, and the indexes of a block that cannot be in the file.
     nitfsample::Image cut = good;
     cut.blockData[0] = data.substr(0, 77 + 1000);
-    EXPECT_NE(readEverything(fileWith(cut)).find("The VQ codebook"), std::string::npos);
+    EXPECT_NE(readEverything(cut).find("The VQ codebook"), std::string::npos);
     cut.blockData[0] = data.substr(0, 77 + 65536 + 10);
-    EXPECT_NE(readEverything(fileWith(cut)).find("The indexes of a VQ block"), std::string::npos);
+    EXPECT_NE(readEverything(cut).find("The indexes of a VQ block"), std::string::npos);
     // Several bands interleaved by pixel: each kernel holds one band's pixels.
     nitfsample::Image pixelInterleaved = vqImage(layout, 1, 1, 3, 'P');
-    EXPECT_NE(readEverything(fileWith(pixelInterleaved)).find("must have one band"), std::string::npos);
+    EXPECT_NE(readEverything(pixelInterleaved).find("must have one band"), std::string::npos);
     // Caller's rows too short for the block.
-    OpenImage image(fileWith(good));
+    OpenedSample image(good);
     std::vector<char> pixels(4096);
-    EXPECT_THROW(
-        image.source->readTileNonInterleaved(&image.reader, pixels.data(), layout.blockWidth() - 1, 0, 0, 0),
-        vexo::Exception);
+    EXPECT_THROW(image.source().readTileNonInterleaved(&image.reader(), pixels.data(),
+                                                       layout.blockWidth() - 1, 0, 0, 0),
+                 vexo::Exception);
 }

@@ -12,6 +12,7 @@
 #include "NitfLabelSource.h"
 #include "NitfLutSource.h"
 #include "NitfRegionReader.h"
+#include "NitfSampleWriter.h"
 #include "NitfSymbolSource.h"
 #include "NitfTextSource.h"
 
@@ -57,6 +58,15 @@ void readImage(CNitfFileReader& reader, int index) {
         region.setBigEndian(true);
         region.read(0, region.getHeight() - rows, width, rows, {}, samples.data(),
                     CNitfRegionReader::ePixelInterleaved);
+    }
+    if (region.getResolutionLevels() > 1) {
+        region.setLevel(std::min(2, region.getResolutionLevels() - 1));
+        const int w = std::min(region.getWidth(), 64), h = std::min(region.getHeight(), 64);
+        if (w > 0 && h > 0 &&
+            region.getBufferSize(w, h, region.getBandCount()) <= static_cast<size_t>(kLargestBuffer)) {
+            std::vector<unsigned char> samples(region.getBufferSize(w, h, region.getBandCount()));
+            region.read(0, 0, w, h, {}, samples.data(), CNitfRegionReader::ePixelInterleaved);
+        }
     }
     for (int i = 0; i < source->getLutCount(); ++i) {
         CNitfLutSource* lut = source->getLutSource(i);
@@ -135,4 +145,23 @@ void readEveryImage(CNitfFileReader& reader) {
             // refused: fine
         }
     }
+}
+
+void readSample(const nitfsample::Image& image) {
+    nitfsample::File file;
+    file.images = {image};
+    std::string bytes;
+    try {
+        bytes = nitfsample::build(file);
+    } catch (const std::exception&) {
+        return; // a shape the writer cannot lay out
+    }
+    CNitfFileReader reader;
+    try {
+        if (!reader.openMemory(bytes.data(), bytes.size()))
+            return;
+    } catch (const vexo::Exception&) {
+        return;
+    }
+    readEveryImage(reader);
 }
