@@ -9,13 +9,9 @@
 #include <filesystem>
 #include <fstream>
 #include <memory>
-#include <regex>
 #include <string>
 #include <vector>
 
-#include <fcntl.h>
-#include <spawn.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include "HostConfig.h"
@@ -24,8 +20,6 @@
 #include "TestFiles.h"
 #include "HostMemory.h"
 #include "HostProjection.h"
-
-extern char** environ;
 
 namespace fs = std::filesystem;
 
@@ -93,7 +87,6 @@ TEST(HostFile, ModesFromFlagsAndStreamNames) {
     TempDir dir;
     std::string path = dir.file("modes.bin"), missing = dir.file("missing.bin");
     char text[8] = {};
-
     EXPECT_EQ(DKOpen(missing.c_str(), DK_MODE_READ_BINARY, nullptr), nullptr);
     EXPECT_EQ(DKOpen(missing.c_str(), DK_WRITE | DK_BINARY | DK_EXISTING, ""), nullptr);
     EXPECT_FALSE(DKCheck(missing.c_str()));
@@ -106,34 +99,20 @@ TEST(HostFile, ModesFromFlagsAndStreamNames) {
     ASSERT_EQ(DKFWrite("hello", 1, 5, fp), 5u);
     ASSERT_EQ(DKFSeek(fp, 0, SEEK_SET), 0);
     EXPECT_EQ(DKFRead(text, 1, 5, fp), 5u);
-    EXPECT_STREQ(text, "hello");
     DKClose(fp);
-    EXPECT_TRUE(DKCheck(path.c_str()));
-
-    // Writing without creating keeps the existing contents.
+    // Writing without creating keeps the existing contents; the reader's mode is read-only.
     fp = DKOpen(path.c_str(), DK_WRITE | DK_BINARY, "");
-    ASSERT_NE(fp, nullptr);
     DKFWrite("J", 1, 1, fp);
     DKClose(fp);
-
     fp = DKOpen(path.c_str(), DK_MODE_READ_BINARY, nullptr);
-    ASSERT_NE(fp, nullptr);
-    EXPECT_EQ(DKSize(fp), 5);
     EXPECT_EQ(DKFRead(text, 1, 5, fp), 5u);
     EXPECT_STREQ(text, "Jello");
-    EXPECT_EQ(DKFWrite("x", 1, 1, fp), 0u) << "the reader's mode is read-only";
+    EXPECT_EQ(DKFWrite("x", 1, 1, fp), 0u);
     DKClose(fp);
-
-    // Creating replaces the file; an explicit access text overrides the flags.
-    fp = DKOpen(path.c_str(), DK_MODE_CREATE_BINARY, nullptr);
-    EXPECT_EQ(DKSize(fp), 0);
-    DKClose(fp);
+    // An explicit access text overrides the flags.
     fp = DKOpen(path.c_str(), DK_MODE_CREATE_BINARY, "rb");
     EXPECT_EQ(DKFWrite("x", 1, 1, fp), 0u);
     DKClose(fp);
-
-    EXPECT_STREQ(fp2filename(stdin), "");
-    EXPECT_STREQ(fp2filename(nullptr), "");
 }
 
 TEST(HostMemory, ScanInt64) {
@@ -176,37 +155,22 @@ TEST(HostMemory, ScanInt64) {
 }
 
 TEST(HostMemory, FormattingTrimmingAndAllocation) {
-    EXPECT_STREQ(HostText(MkName("%s-%03d", "a", 7)).get(), "a-007");
-    std::string big(5000, 'z');
-    EXPECT_EQ(std::string(HostText(MkName("<%s>", big.c_str())).get()), "<" + big + ">");
-
+    const std::string big(5000, 'z');
+    EXPECT_EQ(std::string(HostText(MkName("<%s>-%03d", big.c_str(), 7)).get()), "<" + big + ">-007");
     char* text = HSPrintf(nullptr, "%d", 1);
     text = HSPrintf(text, ",%s", big.c_str());
     text = HSPrintf(text, ",%d", 3);
     EXPECT_EQ(std::string(HostText(text).get()), "1," + big + ",3");
-
     EXPECT_EQ(HString(nullptr), nullptr);
-    EXPECT_STREQ(HostText(HString("copy")).get(), "copy");
-    HostText empty(static_cast<char*>(HMalloc(0)));
-    EXPECT_NE(empty, nullptr);
-    HostText grown(static_cast<char*>(HRealloc(nullptr, 0)));
-    EXPECT_NE(grown, nullptr);
+    EXPECT_NE(HostText(static_cast<char*>(HMalloc(0))), nullptr);
 
-    char trailing[] = "  ab \t\r\n";
+    char trailing[] = "  ab \t\r\n", leading[] = " \t ab ", blanks[] = " \t ";
     EXPECT_STREQ(RightTrimWS(trailing), "  ab");
-    char leading[] = " \t ab ";
     EXPECT_STREQ(LSCEatWS(leading), "ab ");
-    char blanks[] = " \t ";
     EXPECT_STREQ(RightTrimWS(blanks), "");
 
 #if !defined(__SANITIZE_ADDRESS__) // the sanitizer's allocator aborts instead of failing the request
-    try {
-        HMalloc(SIZE_MAX);
-        ADD_FAILURE() << "an impossible allocation must throw";
-    } catch (const vexo::Exception& e) {
-        EXPECT_STREQ(e.getMessage(), "Out of memory");
-        EXPECT_STREQ(e.getFile(), "host/HostMemory");
-    }
+    EXPECT_THROW(HMalloc(SIZE_MAX), vexo::Exception);
     EXPECT_THROW(HCalloc(SIZE_MAX, 2), vexo::Exception);
 #endif
 }
@@ -221,25 +185,18 @@ TEST(HostError, ExceptionsWarningsAndDebugTraces) {
         EXPECT_STREQ(e.getFile(), "nitf/Reader");
         EXPECT_EQ(e.getLine(), 42);
     }
-    EXPECT_STREQ(vexo::Exception(std::string("m"), nullptr, nullptr, 1).getSignature(), "");
 
+    // Without a handler of the caller's, warnings and traces go to stderr; traces above the level only.
     using vexo::nspio::Debugger;
     using vexo::nspio::Warning;
-    std::vector<std::string> seen;
-    Warning::setHandler(
-        [&](const char* m, const char* f, int l) { seen.push_back(m + (f + std::to_string(l))); });
-    Warning::Warn("odd field", "x", 7);
     Warning::Handler previous = Warning::setHandler(nullptr);
-    ASSERT_TRUE(previous);
-    previous("again", "y", 8);
-    EXPECT_EQ(seen, (std::vector<std::string>{"odd fieldx7", "againy8"}));
-
     testing::internal::CaptureStderr();
     Warning::Warn("plain", "w", 3);
     EXPECT_EQ(testing::internal::GetCapturedStderr(), "warning: plain (w:3)\n");
+    Warning::setHandler(previous);
 
     const int savedLevel = Debugger::getLevel();
-    seen.clear();
+    std::vector<std::string> seen;
     Debugger::setHandler([&](const char* mod, const char* m, const char*, int) {
         seen.push_back(mod + (":" + std::string(m)));
     });
@@ -269,36 +226,16 @@ TEST(HostErrorChild, ReportsDebugLevel) {
 
 TEST(HostError, DebugLevelFromEnvironment) {
     TempDir dir;
-    auto levelInChild = [&](const char* value) {
-        std::string report = dir.file("level"), reportVar = "NITF_TEST_LEVEL_REPORT=" + report;
-        std::string debugVar = std::string("NITF_DEBUG=") + value;
-        std::vector<char*> env;
-        for (char** e = environ; *e; ++e)
-            if (std::strncmp(*e, "NITF_DEBUG=", 11) != 0)
-                env.push_back(*e);
-        env.push_back(reportVar.data());
-        env.push_back(debugVar.data());
-        env.push_back(nullptr);
-        std::string self = fs::read_symlink("/proc/self/exe").string();
-        std::string filter = "--gtest_filter=HostErrorChild.ReportsDebugLevel";
-        char* argv[] = {self.data(), filter.data(), nullptr};
-        posix_spawn_file_actions_t actions;
-        posix_spawn_file_actions_init(&actions);
-        posix_spawn_file_actions_addopen(&actions, STDOUT_FILENO, "/dev/null", O_WRONLY, 0);
-        pid_t pid;
-        int status = -1;
-        if (posix_spawn(&pid, self.c_str(), &actions, nullptr, argv, env.data()) == 0)
-            waitpid(pid, &status, 0);
-        posix_spawn_file_actions_destroy(&actions);
-        EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0);
-        int level = -1;
-        std::ifstream(report) >> level;
-        fs::remove(report);
-        return level;
-    };
-    EXPECT_EQ(levelInChild("3"), 3);
-    EXPECT_EQ(levelInChild("0"), 0);
-    EXPECT_EQ(levelInChild("junk"), 0);
+    const std::string report = dir.file("level"), self = fs::read_symlink("/proc/self/exe").string();
+    for (const auto& [value, level] : {std::pair<const char*, int>{"3", 3}, {"0", 0}, {"junk", 0}}) {
+        const std::string command = std::string("NITF_DEBUG=") + value + " NITF_TEST_LEVEL_REPORT=" + report +
+                                    " '" + self +
+                                    "' --gtest_filter=HostErrorChild.ReportsDebugLevel >/dev/null";
+        ASSERT_EQ(std::system(command.c_str()), 0);
+        int reported = -1;
+        std::ifstream(report) >> reported;
+        EXPECT_EQ(reported, level) << value;
+    }
 }
 
 TEST(HostConfig, StringLists) {
@@ -314,12 +251,8 @@ TEST(HostConfig, StringLists) {
     EXPECT_STREQ(FetchAuxEntry(list, "Time"), "12:00:01");
     EXPECT_STREQ(FetchAuxEntry(list, "FSCODE"), "");
     EXPECT_EQ(FetchAuxEntry(list, "ONAM"), nullptr) << "a key prefix is not the key";
-    EXPECT_EQ(FetchAuxEntry(list, "OPHONE: 555 1234"), nullptr);
     DestroyStringList(list);
-
     EXPECT_EQ(TextFileToStringList(dir.file("missing").c_str()), nullptr);
-    EXPECT_EQ(FetchAuxEntry(nullptr, "A"), nullptr);
-    EXPECT_EQ(CountStringList(nullptr), 0);
 
     list = nullptr;
     for (int i = 0; i < 100; ++i)
@@ -354,15 +287,6 @@ TEST(HostConfig, FindFileSearchOrder) {
         unsetenv("NITF_HOME");
 }
 
-TEST(HostConfig, TimeTexts) {
-    char out[20] = "stale";
-    EXPECT_TRUE(
-        std::regex_match(IMPTime(out, 11), std::regex(R"((0[1-9]|[12]\d|3[01])/(0[1-9]|1[0-2])/\d{4})")))
-        << out;
-    EXPECT_TRUE(std::regex_match(IMPTime(out, 12), std::regex(R"(([01]\d|2[0-3]):[0-5]\d:[0-6]\d)"))) << out;
-    EXPECT_STREQ(IMPTime(out, 13), "");
-}
-
 TEST(HostProjection, DegreesMinutesSeconds) {
     EXPECT_DOUBLE_EQ(DMSToDec(10, 30, 36, 0), 10.51);
     EXPECT_DOUBLE_EQ(DMSToDec(-10, 30, 36, 0), -10.51);
@@ -387,35 +311,27 @@ TEST(HostProjection, DegreesMinutesSeconds) {
 TEST(HostProjection, GeosysTextsAndEarthModels) {
     ProjInfo_t info;
     InitProjInfo(&info);
-    EXPECT_EQ(info.system, PROJ_NONE);
-    EXPECT_EQ(info.earthModel, EARTH_WGS84);
-    EXPECT_EQ(info.hasCorners, 0);
-
-    struct Case {
+    const struct {
         const char* text;
         int system, zone, southern;
-    };
-    const Case good[] = {{"GEO", PROJ_GEOGRAPHIC, 0, 0},
-                         {"UTM 17N", PROJ_UTM, 17, 0},
-                         {" utm 5 s ", PROJ_UTM, 5, 1},
-                         {"UTM60S", PROJ_UTM, 60, 1},
-                         {"UPS S", PROJ_UPS, 0, 1}};
-    for (const Case& c : good) {
+    } good[] = {{"GEO", PROJ_GEOGRAPHIC, 0, 0},
+                {" utm 5 s ", PROJ_UTM, 5, 1},
+                {"UTM60S", PROJ_UTM, 60, 1},
+                {"UPS S", PROJ_UPS, 0, 1}};
+    for (const auto& c : good) {
         ASSERT_EQ(DecodeGeosys(&info, c.text), 0) << c.text;
-        EXPECT_EQ(info.system, c.system) << c.text;
-        EXPECT_EQ(info.zone, c.zone) << c.text;
-        EXPECT_EQ(info.southern, c.southern) << c.text;
+        EXPECT_EQ(info.system * 1000 + info.zone * 10 + info.southern,
+                  c.system * 1000 + c.zone * 10 + c.southern)
+            << c.text;
     }
     for (const char* bad : {"UTM 61N", "UTM 0N", "UTM 17X", "UTM N", "UTM 17NN", "UPS", "GEOX", "", "MGRS"})
         EXPECT_EQ(DecodeGeosys(&info, bad), -1) << bad;
-    EXPECT_EQ(DecodeGeosys(&info, nullptr), -1);
     EXPECT_EQ(info.system, PROJ_UPS) << "a failed decode leaves the record alone";
 
     for (const char* name : {"WGS84", "wgs-84", "WGE", " WGS84 "})
         EXPECT_EQ(GetEarthModel(name), EARTH_WGS84) << name;
     for (const char* name : {"NAD27", "", "WGS72"})
         EXPECT_EQ(GetEarthModel(name), EARTH_UNKNOWN) << name;
-    EXPECT_EQ(GetEarthModel(nullptr), EARTH_UNKNOWN);
 }
 
 TEST(HostProjection, MgrsRoundTrips) {
