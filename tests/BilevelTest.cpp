@@ -90,18 +90,8 @@ TEST(BiLevelHuffman, FirstLineCodedTwoDimensionallyRefersToWhite) {
     // EOL, tag 0, horizontal: white 3 (1000), black 2 (11); V0 on b1 = the end of the line. Black 1088 is
     // make-up 0000001110101 and terminating 0 0000110111 as published.
     BitWriter out;
-    out.put("000000000001"
-            "0"
-            "001"
-            "1000"
-            "11"
-            "1");
-    out.put("000000000001"
-            "1"
-            "00110101"
-            "0000001110101"
-            "0000110111"
-            "0111");
+    out.put(joined({"000000000001", "0", "001", "1000", "11", "1"}));
+    out.put(joined({"000000000001", "1", "00110101", "0000001110101", "0000110111", "0111"}));
     Page expected{1090, 2, std::vector<uint8_t>(2180, 0)};
     expected.at(0, 3) = expected.at(0, 4) = 1;
     for (int c = 0; c < 1088; ++c)
@@ -114,10 +104,7 @@ TEST(BiLevelHuffman, FirstLineCodedTwoDimensionallyRefersToWhite) {
 TEST(BiLevelHuffman, DamageEndsTheBlockWithWhatWasDecoded) {
     // Lines of 8 pixels. The first is white 4 (1011), black 4 (011) wherever it is complete; the rows after
     // the damage, and runs whose end was not decoded, are white.
-    const std::string eol = "000000000001",
-                      firstLine = "1011"
-                                  "011",
-                      white8 = "10011";
+    const std::string eol = "000000000001", firstLine = joined({"1011", "011"}), white8 = "10011";
     struct Case {
         const char* what;
         bool twoDimensional;
@@ -134,11 +121,7 @@ TEST(BiLevelHuffman, DamageEndsTheBlockWithWhatWasDecoded) {
         {"no data", false, "", BiLevelHuffman::eDamageTruncated, 0},
         {"VR1, then VR3 past the end", true, eol + "1" + firstLine + eol + "0" + "011" + "0000011",
          BiLevelHuffman::eDamageRunPastLine, 1},
-        {"VL3 before the start", true,
-         eol + "1" +
-             "0111"
-             "0010" +
-             eol + "0" + "0000010",
+        {"VL3 before the start", true, eol + "1" + joined({"0111", "0010"}) + eol + "0" + "0000010",
          BiLevelHuffman::eDamageBadCode, 1},
         {"extension code", true, eol + "1" + firstLine + eol + "0" + "0000001111",
          BiLevelHuffman::eDamageBadCode, 1},
@@ -151,10 +134,8 @@ TEST(BiLevelHuffman, DamageEndsTheBlockWithWhatWasDecoded) {
         EXPECT_EQ(decoded.result.damage, c.damage) << BiLevelHuffman::describe(decoded.result.damage);
         EXPECT_EQ(decoded.result.rows, c.rows);
         EXPECT_EQ(decoded.result.damagedRow, c.rows);
-        const char* row0 = c.bits.find("0111"
-                                       "0010") != std::string::npos
-                               ? "\0\0\1\1\1\1\1\1"
-                               : "\0\0\0\0\1\1\1\1";
+        const char* row0 = c.bits.find(joined({"0111", "0010"})) != std::string::npos ? "\0\0\1\1\1\1\1\1"
+                                                                                      : "\0\0\0\0\1\1\1\1";
         EXPECT_TRUE(decoded.pixels == (c.rows == 1 ? std::string(row0, 8) + white(16) : white(24)));
     }
 }

@@ -74,10 +74,7 @@ TEST(FileStructure, VersionsAreDetectedFromTheFirstNineBytes) {
 }
 
 TEST(FileStructure, SegmentTablesChainFromTheHeaderLength) {
-    ByteStream table("002000499"
-                     "0000000100"
-                     "000512"
-                     "0000000200");
+    ByteStream table(joined({"002000499", "0000000100", "000512", "0000000200"}));
     std::vector<CNitfHeaderDataPair*> pairs;
     __int64 fieldBytes = 0;
     int count = 0;

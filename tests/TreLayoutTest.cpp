@@ -33,8 +33,7 @@ TEST(TreLayouts, BandsFollowTheExistenceMask) {
         bandsHead(2) + bigEndian(0x91002001, 4) + padText("DETECTOR", 24) + bigEndian(0, 4) + "U";
     data += padText("BAND ONE", 50) + "0.45000" + "0000.01" + "0000.02";
     data += padText("BAND TWO", 50) + "0.55000" + "0000.03" + "0000.04";
-    data += "01"
-            "01";
+    data += joined({"01", "01"});
     data += "I" + padText("COUNTS", 7) + padNumber(10, 10) + padNumber(20, 10);
     data += "A" + padText("NONE", 7) + padText("CUBE NOTE", 20);
     auto bands = parseTre("BANDSB", data);
@@ -92,20 +91,8 @@ TEST(TreLayouts, HistoryEventsWithCommentsAndFlags) {
 TEST(TreLayouts, EngineeringRecordsSizeTheirOwnFields) {
     const std::string binary("\0\1\0\2\0\3", 6);
     std::string data = padText("SENSOR", 20) + "002";
-    data += "05LABEL"
-            "0003"
-            "0001"
-            "I"
-            "2"
-            "NA" +
-            padNumber(3, 8) + binary;
-    data += "04TEXT"
-            "0001"
-            "0001"
-            "A"
-            "1"
-            "NA" +
-            padNumber(5, 8) + "HELLO";
+    data += joined({"05LABEL", "0003", "0001", "I", "2", "NA"}) + padNumber(3, 8) + binary;
+    data += joined({"04TEXT", "0001", "0001", "A", "1", "NA"}) + padNumber(5, 8) + "HELLO";
     auto records = parseTre("ENGRDA", data);
 
     EXPECT_EQ(records->getReadLength(), size(data));
@@ -116,17 +103,13 @@ TEST(TreLayouts, EngineeringRecordsSizeTheirOwnFields) {
 }
 
 TEST(TreLayouts, AmplitudeMappingForms) {
-    auto shift = parseTre("IOMAPA", "0010"
-                                    "04");
+    auto shift = parseTre("IOMAPA", joined({"0010", "04"}));
     EXPECT_EQ(shift->getReadLength(), 6);
     EXPECT_EQ(field(*shift, "S2"), "04");
     EXPECT_FALSE(hasField(*shift, "S1"));
     EXPECT_FALSE(hasField(*shift, "TABLE_ID"));
 
-    std::string table = "0011"
-                        "01"
-                        "01"
-                        "02";
+    std::string table = joined({"0011", "01", "01", "02"});
     for (int i = 0; i < 4096; ++i)
         table += bigEndian(4095 - i, 2);
     auto lookup = parseTre("IOMAPA", table);
@@ -137,52 +120,26 @@ TEST(TreLayouts, AmplitudeMappingForms) {
     EXPECT_TRUE(hasField(*lookup, "OUTPUT_MAP_VALUE_4095"));
     EXPECT_FALSE(hasField(*lookup, "OUTPUT_MAP_VALUE_4096"));
 
-    auto logarithmic = parseTre("IOMAPA", "0012"
-                                          "01"
-                                          "00"
-                                          "00"
-                                          "002"
-                                          "128");
+    auto logarithmic = parseTre("IOMAPA", joined({"0012", "01", "00", "00", "002", "128"}));
     EXPECT_EQ(logarithmic->getReadLength(), 16);
     EXPECT_EQ(field(*logarithmic, "R_FRACTION"), "128");
 
     std::string coefficients(72, '\x3F');
-    auto polynomial = parseTre("IOMAPA", "0013"
-                                         "01"
-                                         "00"
-                                         "00"
-                                         "3"
-                                         "1000"
-                                         "2000" +
-                                             coefficients);
+    auto polynomial =
+        parseTre("IOMAPA", joined({"0013", "01", "00", "00", "3", "1000", "2000"}) + coefficients);
     EXPECT_EQ(polynomial->getReadLength(), 91);
     EXPECT_EQ(field(*polynomial, "TABLE_ID"), "01");
     EXPECT_EQ(field(*polynomial, "OUT_B5_3"), "????");
     // The same form written with a one-byte TABLE_ID: 90 bytes.
-    auto narrow = parseTre("IOMAPA", "0013"
-                                     "1"
-                                     "00"
-                                     "00"
-                                     "3"
-                                     "1000"
-                                     "2000" +
-                                         coefficients);
+    auto narrow = parseTre("IOMAPA", joined({"0013", "1", "00", "00", "3", "1000", "2000"}) + coefficients);
     EXPECT_EQ(narrow->getReadLength(), 90);
     EXPECT_EQ(field(*narrow, "TABLE_ID"), "1");
     EXPECT_EQ(field(*narrow, "XOB_2"), "2000");
 }
 
 TEST(TreLayouts, LayerInformationOfParsedStreams) {
-    std::string layers = "05"
-                         "00003"
-                         "002"
-                         "000"
-                         "00.500000"
-                         "001"
-                         "01.000000";
-    std::string parsed = "04"
-                         "00003"
-                         "001";
+    std::string layers = joined({"05", "00003", "002", "000", "00.500000", "001", "01.000000"});
+    std::string parsed = joined({"04", "00003", "001"});
     auto withParsed = parseTre("J2KLRA", "1" + layers + parsed);
     EXPECT_EQ(withParsed->getReadLength(), 45);
     EXPECT_EQ(field(*withParsed, "BITRATE_2"), "01.000000");
@@ -256,14 +213,8 @@ TEST(TreRobustness, CountsFromTheFileAreBoundedByItsBytes) {
               0x20000u);
 
     // ENGDATC x ENGDTS far beyond the file: the field runs to the end of the file.
-    std::string huge = padText("S", 20) + "001" + "00" +
-                       "0001"
-                       "0001"
-                       "A"
-                       "9"
-                       "NA"
-                       "99999999" +
-                       "tail";
+    std::string huge =
+        padText("S", 20) + "001" + "00" + joined({"0001", "0001", "A", "9", "NA", "99999999"}) + "tail";
     auto records = parseTre("ENGRDA", huge);
     EXPECT_EQ(field(*records, "ENGDATA_1"), "tail");
     EXPECT_EQ(records->getReadLength(), size(huge));

@@ -101,3 +101,10 @@ int CapturedWarnings::count(const std::string& part) const {
         n += message.find(part) != std::string::npos;
     return n;
 }
+
+std::string joined(std::initializer_list<std::string> fields) {
+    std::string out;
+    for (const std::string& field : fields)
+        out += field;
+    return out;
+}

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstdio>
+#include <initializer_list>
 #include <string>
 #include <vector>
 
@@ -71,3 +72,6 @@ private:
     std::vector<std::string> m_messages;
     vexo::nspio::Warning::Handler m_previous;
 };
+
+// Fields side by side, written one by one for the reader: joined({"0011", "07"}) is "001107".
+std::string joined(std::initializer_list<std::string> fields);
