@@ -15,10 +15,7 @@ namespace {
 std::string written(CNitfProperty& property, int width) {
     ByteStream stream("");
     property.writeString(stream, width);
-    std::string bytes(static_cast<size_t>(DKFTell(stream)), '\0');
-    DKFSeek64(stream, 0, SEEK_SET);
-    DKFRead(&bytes[0], 1, bytes.size(), stream);
-    return bytes;
+    return stream.contents();
 }
 
 } // namespace

@@ -12,18 +12,7 @@
 #include "NitfHeaderDataPair.h"
 #include "TestFiles.h"
 
-namespace {
-
-std::string contents(FILE* fp) {
-    long long end = DKFTell(fp);
-    DKFSeek64(fp, 0, SEEK_SET);
-    std::string bytes(static_cast<size_t>(end), '\0');
-    if (!bytes.empty())
-        DKFRead(&bytes[0], 1, bytes.size(), fp);
-    return bytes;
-}
-
-} // namespace
+namespace {} // namespace
 
 TEST(SegmentRecords, PairsLayDataRightAfterTheSubheader) {
     CNitfHeaderDataPair pair(1000, 439, 65536), empty(0, 499, 0);
@@ -73,7 +62,7 @@ TEST(SegmentRecords, DecimalFieldsAndTheirLimits) {
     writer.writeDecimal64(12000000000LL, 12, true);
     writer.writeText("ABCDEFGH", 5);
     writer.writeText("AB", 4);
-    EXPECT_EQ(contents(out), "000042    4200-5012000000000ABCDEAB  ");
+    EXPECT_EQ(out.contents(), "000042    4200-5012000000000ABCDEAB  ");
 }
 
 TEST(SegmentRecords, BinaryFieldsAreBigEndian) {
@@ -81,7 +70,7 @@ TEST(SegmentRecords, BinaryFieldsAreBigEndian) {
     CDataStreamWrite writer(out);
     writer.writeUint16(0x0102);
     writer.writeInt32(0x03040506);
-    EXPECT_EQ(contents(out), std::string("\x01\x02\x03\x04\x05\x06", 6));
+    EXPECT_EQ(out.contents(), std::string("\x01\x02\x03\x04\x05\x06", 6));
 
     DKFSeek64(out, 0, SEEK_SET);
     CDataStreamRead reader(out);

@@ -23,14 +23,6 @@ struct Record : nitf::CSerializable {
     }
 };
 
-std::string contents(FILE* fp) {
-    long long end = DKFTell(fp);
-    DKFSeek64(fp, 0, SEEK_SET);
-    std::string bytes(static_cast<size_t>(end), '\0');
-    DKFRead(&bytes[0], 1, bytes.size(), fp);
-    return bytes;
-}
-
 } // namespace
 
 // (Queries, and records of every number type, are checked with the record engine.)
@@ -39,10 +31,10 @@ TEST(Serializer, SwappingWritesBigEndianButNeverSwapsArrays) {
     nitf::CSerializerFileRaw raw(out, true);
     Record record;
     raw << record << 1.0;
-    EXPECT_EQ(contents(out), std::string("\x01\x02\x03\x04\x05\x06"
-                                         "ABC"
-                                         "\x3F\xF0\0\0\0\0\0\0",
-                                         17));
+    EXPECT_EQ(out.contents(), std::string("\x01\x02\x03\x04\x05\x06"
+                                          "ABC"
+                                          "\x3F\xF0\0\0\0\0\0\0",
+                                          17));
     raw.seek(0);
     Record back;
     back.a = back.b = 0;

@@ -52,6 +52,11 @@ ByteStream::~ByteStream() {
     DKClose(m_fp);
 }
 
+std::string ByteStream::contents() const {
+    std::fflush(m_fp);
+    return m_file.read();
+}
+
 std::string corpusRoot() {
     const char* env = std::getenv("NITF_TEST_DATA");
     if (env && *env)

@@ -35,6 +35,8 @@ public:
 
     FILE* get() const { return m_fp; }
     operator FILE*() const { return m_fp; }
+    // Everything in the stream, what was written to it included.
+    std::string contents() const;
 
 private:
     TempFile m_file;
