@@ -23,7 +23,7 @@ const long long kLargestBuffer = 64LL << 20;
 // Enough block reads to reach every code path without making a single input slow.
 const int kBlockReads = 4096;
 
-void readImage(CNitfFileReader& reader, int index) {
+void readImageOf(CNitfFileReader& reader, int index) {
     std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(index));
     const CNitfImagePropertiesIF& p = source->getImageProperties();
     const long long height = std::max(p.getTileHeight(), 0);
@@ -137,14 +137,18 @@ void walkBytes(const void* data, size_t size, std::string* refusal) {
     walkOpened([&](CNitfFileReader& reader) { return reader.openMemory(data, size) != nullptr; }, refusal);
 }
 
-void readEveryImage(CNitfFileReader& reader) {
-    for (int index = 0; index < std::min(reader.getImageCount(), 32); ++index) {
-        try {
-            readImage(reader, index);
-        } catch (const vexo::Exception&) {
-            // refused: fine
-        }
+std::string readImage(CNitfFileReader& reader, int index) {
+    try {
+        readImageOf(reader, index);
+    } catch (const vexo::Exception& e) {
+        return e.what();
     }
+    return "";
+}
+
+void readEveryImage(CNitfFileReader& reader) {
+    for (int index = 0; index < std::min(reader.getImageCount(), 32); ++index)
+        readImage(reader, index);
 }
 
 void readSample(const nitfsample::Image& image) {

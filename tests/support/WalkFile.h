@@ -15,6 +15,8 @@ class CNitfFileReader;
 // reduced resolution, where the source holds one), the look-up tables.
 // Refusals with vexo::Exception are taken as they come.
 void readEveryImage(CNitfFileReader& reader);
+// One of them; the message of its refusal, or "" when it was read.
+std::string readImage(CNitfFileReader& reader, int index);
 // The same for a file held in memory.
 void walkBytes(const void* data, size_t size, std::string* refusal = nullptr);
 
