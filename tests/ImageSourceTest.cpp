@@ -113,31 +113,19 @@ TEST(ImageSourceRoundTrip, InterleavedBlocksAndWiderRowsHoldTheSameSamples) {
 }
 
 TEST(ImageSourceLayout, BlockOffsetsFollowTheInterleaving) {
-    // Band-sequential: block (1, 0) of band 2 in 2 x 2 blocks is entry 9, nine band-blocks into the data.
-    Image sequential;
-    sequential.cols = sequential.rows = 8;
-    sequential.nppbh = sequential.nppbv = 4;
-    sequential.bands = 3;
-    sequential.imode = 'S';
-    OpenedSample s(sequential);
-    const unsigned long long start = s.source<CNitfImageSourceUncompressed>().getTileOffset(0);
-    EXPECT_EQ(s.source<CNitfImageSourceUncompressed>().getTileOffset(1, 0, 2),
-              s.source<CNitfImageSourceUncompressed>().getTileOffset(9));
-    EXPECT_EQ(s.source<CNitfImageSourceUncompressed>().getTileOffset(1, 0, 2), start + 9 * 16);
-    EXPECT_EQ(s.source<CNitfImageSourceUncompressed>().getTileOffset(2, 0, 0), CNitfImageSource::kAbsentBlock)
-        << "no such block";
-    EXPECT_EQ(s.source<CNitfImageSourceUncompressed>().getTileOffset(0, 0, 3), CNitfImageSource::kAbsentBlock)
-        << "no such band";
-    EXPECT_EQ(s.source<CNitfImageSourceUncompressed>().getTileOffset(12), 0u) << "outside the table";
-
-    // Band-interleaved by block: band 2 of block (1, 0) lies two band-blocks into the block.
-    sequential.imode = 'B';
-    OpenedSample b(sequential);
-    EXPECT_EQ(b.source<CNitfImageSourceUncompressed>().getTileOffset(1, 0, 2), start + 1 * 48 + 2 * 16);
-    // Pixel- and row-interleaved: one offset per block whatever the band.
-    sequential.imode = 'R';
-    OpenedSample r(sequential);
-    EXPECT_EQ(r.source<CNitfImageSourceUncompressed>().getTileOffset(1, 1, 2), start + 3 * 48);
+    // Band-sequential 2 x 2 blocks of 3 bands: block (1, 0) of band 2 is entry 9, nine band-blocks in.
+    Image image;
+    image.cols = image.rows = 8;
+    image.nppbh = image.nppbv = 4;
+    image.bands = 3;
+    image.imode = 'S';
+    OpenedSample s(image);
+    auto& source = s.source<CNitfImageSourceUncompressed>();
+    const unsigned long long start = source.getTileOffset(0);
+    EXPECT_EQ(source.getTileOffset(1, 0, 2), start + 9 * 16);
+    EXPECT_EQ(source.getTileOffset(2, 0, 0), CNitfImageSource::kAbsentBlock) << "no such block";
+    EXPECT_EQ(source.getTileOffset(0, 0, 3), CNitfImageSource::kAbsentBlock) << "no such band";
+    EXPECT_EQ(source.getTileOffset(12), 0u) << "outside the table";
 
     // 3 x 3 blocks of 4 bits hold 4.5 bytes: each block takes 5.
     Image odd;
@@ -145,9 +133,8 @@ TEST(ImageSourceLayout, BlockOffsetsFollowTheInterleaving) {
     odd.nppbh = odd.nppbv = 3;
     odd.nbpp = 4;
     OpenedSample o(odd);
-    EXPECT_EQ(o.source<CNitfImageSourceUncompressed>().getTileOffset(1, 0, 0) -
-                  o.source<CNitfImageSourceUncompressed>().getTileOffset(0, 0, 0),
-              5u);
+    auto& packed = o.source<CNitfImageSourceUncompressed>();
+    EXPECT_EQ(packed.getTileOffset(1, 0, 0) - packed.getTileOffset(0, 0, 0), 5u);
     EXPECT_EQ(bandOf(o, 0), nitfsample::canonicalBand(odd, 0));
 }
 
