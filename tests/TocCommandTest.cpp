@@ -3,8 +3,6 @@
 // refusals.
 #include <gtest/gtest.h>
 
-#include <filesystem>
-#include <fstream>
 #include <string>
 
 #include "Manifest.h"
@@ -14,7 +12,6 @@
 namespace {
 
 using nlohmann::json;
-namespace fs = std::filesystem;
 
 // The tool's output; `status` receives its exit status.
 std::string toc(const std::string& arguments, int& status) {
@@ -23,26 +20,14 @@ std::string toc(const std::string& arguments, int& status) {
     return output;
 }
 
-// A scratch directory holding an A.TOC and some of its frames, removed with the object.
-class TocDirectory {
-public:
+// A scratch directory holding an A.TOC and some of its frames.
+struct TocDirectory : TempDir {
     explicit TocDirectory(const std::string& tocBytes) {
-        TempFile marker;
-        m_root = marker.path() + ".dir";
-        fs::create_directories(m_root + "/rpf/onc");
         write("A.TOC", tocBytes);
         // Names on disk in lower case; the table stores them in upper case.
         write("rpf/onc/001zc013.on1", "frame");
         write("001ALL26.I12", "frame");
     }
-    ~TocDirectory() { fs::remove_all(m_root); }
-    std::string path(const std::string& name) const { return m_root + "/" + name; }
-
-private:
-    void write(const std::string& name, const std::string& bytes) const {
-        std::ofstream(path(name), std::ios::binary) << bytes;
-    }
-    std::string m_root;
 };
 
 void expectKnownRectangles(const json& report, const TocDirectory& directory) {
@@ -57,7 +42,7 @@ void expectKnownRectangles(const json& report, const TocDirectory& directory) {
     EXPECT_EQ(frames[0].at("row"), 2);
     EXPECT_EQ(frames[0].at("column"), 0);
     EXPECT_TRUE(frames[0].at("exists").get<bool>());
-    EXPECT_EQ(frames[0].at("file"), directory.path("rpf/onc/001zc013.on1"));
+    EXPECT_EQ(frames[0].at("file"), directory.file("rpf/onc/001zc013.on1"));
     EXPECT_FALSE(frames[1].at("exists").get<bool>());
     EXPECT_TRUE(frames[1].at("file").is_null());
     const json& second = report["rectangles"][1];
@@ -76,13 +61,13 @@ TEST(TocCommand, RawAndNitfWrappedTablesListTheirFrames) {
         SCOPED_TRACE(raw ? "raw" : "NITF-wrapped");
         TocDirectory directory(bytes);
         int status = 0;
-        const json report = json::parse(toc("--json '" + directory.path("A.TOC") + "'", status));
+        const json report = json::parse(toc("--json '" + directory.file("A.TOC") + "'", status));
         EXPECT_EQ(status, 0);
         EXPECT_EQ(report.at("form"), raw ? "raw" : "NITF-wrapped");
         EXPECT_EQ(report.at("header").at("fileName"), "A.TOC");
         expectKnownRectangles(report, directory);
 
-        const std::string text = toc("'" + directory.path("A.TOC") + "'", status);
+        const std::string text = toc("'" + directory.file("A.TOC") + "'", status);
         EXPECT_EQ(status, 0);
         EXPECT_NE(text.find("rectangle 0: CADRG 55:1 scale 1:1,000,000, zone 1"), std::string::npos) << text;
         EXPECT_NE(text.find("./RPF/TPC/001ZE013.ON1  (missing)"), std::string::npos) << text;

@@ -2,6 +2,7 @@
 
 #include <cstdio>
 #include <cstdlib>
+#include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <stdexcept>
@@ -40,6 +41,23 @@ void TempFile::write(const std::string& contents) const {
 
 std::string TempFile::read() const {
     return readWholeFile(m_path);
+}
+
+TempDir::TempDir() {
+    std::string pattern = (std::filesystem::temp_directory_path() / "nitf-test-XXXXXX").string();
+    if (!mkdtemp(&pattern[0]))
+        throw std::runtime_error("cannot create a temporary directory");
+    m_path = pattern;
+}
+
+TempDir::~TempDir() {
+    std::error_code ignored;
+    std::filesystem::remove_all(m_path, ignored);
+}
+
+void TempDir::write(const std::string& name, const std::string& contents) const {
+    std::filesystem::create_directories(std::filesystem::path(file(name)).parent_path());
+    std::ofstream(file(name), std::ios::binary) << contents;
 }
 
 ByteStream::ByteStream(const std::string& bytes) : m_file(bytes, ".bin") {

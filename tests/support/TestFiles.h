@@ -24,6 +24,23 @@ private:
     std::string m_path;
 };
 
+// A private directory in the temporary directory, removed with everything in it when the object goes.
+class TempDir {
+public:
+    TempDir();
+    ~TempDir();
+    TempDir(const TempDir&) = delete;
+    TempDir& operator=(const TempDir&) = delete;
+
+    const std::string& path() const { return m_path; }
+    // The path of `name` inside; write() makes the directories on the way.
+    std::string file(const std::string& name) const { return m_path + "/" + name; }
+    void write(const std::string& name, const std::string& contents) const;
+
+private:
+    std::string m_path;
+};
+
 // A C stream over `bytes` (a temporary file underneath, so 64-bit positions and DKSize work as for real
 // files). Closed and removed by the destructor.
 class ByteStream {
