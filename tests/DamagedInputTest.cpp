@@ -9,7 +9,6 @@
 
 #include "HostError.h"
 #include "JpegStreams.h"
-#include "NitfImageSource.h"
 #include "NitfRegionReader.h"
 #include "NitfTestFile.h"
 #include "Canonical.h"
@@ -19,33 +18,24 @@
 
 namespace {
 
-// Reads the whole image through the region reader; the exception's message when the source is refused.
+std::string bytesOf(const nitfsample::Image& image) {
+    return nitfsample::build(fileOf(image));
+}
+
+// Image 0 read whole through the region reader; the message of its refusal, when it is refused.
 struct WholeRead {
     std::string refusal;
     CNitfRegionReader::Result result;
 };
 
-std::string bytesOf(const nitfsample::Image& image) {
-    return nitfsample::build(fileOf(image));
-}
-
 WholeRead readWhole(const std::string& bytes) {
     WholeRead read;
-    CNitfFileReader reader;
-    if (!reader.openMemory(bytes.data(), bytes.size()))
-        return read;
     try {
-        std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(0));
-        CNitfRegionReader region(&reader, source.get());
-        std::vector<unsigned char> out(region.getBufferSize(region.getWidth(), region.getHeight(), 1));
-        for (int band = 0; band < region.getBandCount(); ++band) {
-            const CNitfRegionReader::Result r =
-                region.read(0, 0, region.getWidth(), region.getHeight(), {band}, out.data());
-            read.result.failedBlocks += r.failedBlocks;
-            read.result.absentBlocks += r.absentBlocks;
-            if (read.result.firstError.empty())
-                read.result.firstError = r.firstError;
-        }
+        OpenedSample file(bytes);
+        CNitfRegionReader region(&file.reader(), &file.source());
+        std::vector<unsigned char> out(
+            region.getBufferSize(region.getWidth(), region.getHeight(), region.getBandCount()));
+        read.result = region.read(0, 0, region.getWidth(), region.getHeight(), {}, out.data());
     } catch (const vexo::Exception& e) {
         read.refusal = e.what();
     }
