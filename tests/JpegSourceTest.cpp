@@ -57,13 +57,16 @@ std::vector<uint16_t> blockOf(OpenedSample& file, int x, int y) {
     return samplesOf(buffer, bytes);
 }
 
-nitfsample::Image jpegImage(const std::string& ic, int size, int blockSize, int bands, int nbpp, char imode,
-                            std::vector<std::string> streams) {
+// `cols` x `rows` pixels in blocks of `blockWidth` x `blockHeight` (0: one block).
+nitfsample::Image jpegImage(const std::string& ic, int cols, int rows, int blockWidth, int blockHeight,
+                            int bands, int nbpp, char imode, std::vector<std::string> streams) {
     nitfsample::Image image;
     image.ic = ic;
     image.comrat = "00.0";
-    image.rows = image.cols = size;
-    image.nppbh = image.nppbv = blockSize;
+    image.cols = cols;
+    image.rows = rows;
+    image.nppbh = blockWidth;
+    image.nppbv = blockHeight;
     image.bands = bands;
     image.nbpp = nbpp;
     image.imode = imode;
@@ -144,7 +147,7 @@ TEST(JpegSource, CommentWithStartPatternDoesNotSplitABlock) {
         quarters.push_back(jpegtest::pattern(16, 16, 1, 8, i));
         streams.push_back(jpegtest::encode(quarters.back(), coding));
     }
-    OpenedSample image(jpegImage("C5", 32, 16, 1, 8, 'B', streams));
+    OpenedSample image(jpegImage("C5", 32, 32, 16, 16, 1, 8, 'B', streams));
     for (int i = 0; i < 4; ++i)
         EXPECT_EQ(bandOf(image, i % 2, i / 2, 0), cut(quarters[i])) << "block " << i;
 }
@@ -169,9 +172,7 @@ TEST(JpegDefaults, TablesFillStreamsThatLackThem) {
         const std::string bare = jpegtest::removeSegments(jpegtest::removeSegments(full, 0xDB), 0xC4);
         ASSERT_LT(bare.size(), full.size());
 
-        nitfsample::Image image = jpegImage("C3", 0, 0, 1, 8, 'B', {bare});
-        image.rows = 48;
-        image.cols = 64;
+        nitfsample::Image image = jpegImage("C3", 64, 48, 0, 0, 1, 8, 'B', {bare});
         image.comrat = "00." + std::to_string(quality);
         OpenedSample file(image);
         EXPECT_EQ(bandOf(file, 0, 0, 0), expected.samples) << "COMRAT " << image.comrat;
@@ -189,9 +190,7 @@ TEST(JpegDefaults, CustomTablesRateInstallsNoQuantisationTable) {
     const Raster raster = jpegtest::pattern(32, 32, 1, 8, 4);
     const std::string full = jpegtest::encode(raster, Coding{});
     const std::string noQuant = jpegtest::removeSegments(full, 0xDB);
-    nitfsample::Image image = jpegImage("C3", 32, 32, 1, 8, 'B', {noQuant});
-    image.comrat = "00.0";
-    OpenedSample file(image);
+    OpenedSample file(jpegImage("C3", 32, 32, 32, 32, 1, 8, 'B', {noQuant}));
     EXPECT_THROW(
         {
             std::vector<char> buffer(32 * 32);
@@ -200,7 +199,7 @@ TEST(JpegDefaults, CustomTablesRateInstallsNoQuantisationTable) {
         vexo::Exception);
     // The Huffman defaults come whatever the rate.
     nitfsample::Image huffmanless =
-        jpegImage("C3", 32, 32, 1, 8, 'B', {jpegtest::removeSegments(full, 0xC4)});
+        jpegImage("C3", 32, 32, 32, 32, 1, 8, 'B', {jpegtest::removeSegments(full, 0xC4)});
     OpenedSample second(huffmanless);
     EXPECT_EQ(bandOf(second, 0, 0, 0), jpegtest::decode(full).samples);
 }
@@ -217,11 +216,7 @@ TEST(JpegSource, LosslessRoundTripsAreExactMaskedOrNot) {
             blocks.push_back(jpegtest::pattern(24, 20, 1, precision, 10 * i + precision));
             streams.push_back(jpegtest::encode(blocks.back(), lossless(precision)));
         }
-        nitfsample::Image image = jpegImage("C5", 0, 0, 1, nbpp, 'B', streams);
-        image.cols = 48;
-        image.rows = 40;
-        image.nppbh = 24;
-        image.nppbv = 20;
+        nitfsample::Image image = jpegImage("C5", 48, 40, 24, 20, 1, nbpp, 'B', streams);
         OpenedSample plain(image);
         for (int i = 0; i < 4; ++i)
             EXPECT_EQ(bandOf(plain, i % 2, i / 2, 0), cut(blocks[i])) << precision << "-bit block " << i;
@@ -251,7 +246,7 @@ TEST(JpegSource, DctStreamsMatchLibjpeg) {
         coding.restartRows = 1;
         const Raster raster = jpegtest::pattern(40, 40, 1, precision, 5);
         const std::string stream = jpegtest::encode(raster, coding);
-        OpenedSample file(jpegImage("C3", 40, 40, 1, precision, 'B', {stream}));
+        OpenedSample file(jpegImage("C3", 40, 40, 40, 40, 1, precision, 'B', {stream}));
         const std::vector<uint16_t> decoded = bandOf(file, 0, 0, 0);
         EXPECT_EQ(decoded, jpegtest::decode(stream).samples) << precision << "-bit";
         EXPECT_LE(maxDifference(decoded, raster.samples), precision == 8 ? 20 : 40) << precision << "-bit";
@@ -268,9 +263,7 @@ TEST(JpegSource, BandSequentialStreamsPerBand) {
         planes.push_back(jpegtest::pattern(16, 16, 1, 12, 7 * i));
         streams.push_back(jpegtest::encode(planes.back(), lossless(12)));
     }
-    nitfsample::Image image = jpegImage("C5", 0, 16, 3, 12, 'S', streams);
-    image.cols = 32;
-    image.rows = 16;
+    nitfsample::Image image = jpegImage("C5", 32, 16, 16, 16, 3, 12, 'S', streams);
     OpenedSample file(image);
     for (int band = 0; band < 3; ++band)
         EXPECT_EQ(bandOf(file, 1, 0, band), cut(planes[band * 2 + 1])) << "band " << band;
@@ -315,7 +308,8 @@ TEST(JpegResampling, IndexMaps) {
 
 TEST(JpegResampling, StreamsOfAnotherSizeFitTheirBlock) {
     const Raster small = jpegtest::pattern(96, 96, 1, 8, 13);
-    OpenedSample enlarged(jpegImage("C5", 128, 128, 1, 8, 'B', {jpegtest::encode(small, lossless(8))}));
+    OpenedSample enlarged(
+        jpegImage("C5", 128, 128, 128, 128, 1, 8, 'B', {jpegtest::encode(small, lossless(8))}));
     const std::vector<uint16_t> up = bandOf(enlarged, 0, 0, 0);
     const std::vector<int> map = CBlockResampler::indexMap(128, 96);
     ASSERT_EQ(up.size(), 128u * 128u);
@@ -334,7 +328,7 @@ TEST(JpegResampling, StreamsOfAnotherSizeFitTheirBlock) {
     EXPECT_EQ(coded[96 * 128], 0xEE);
 
     const Raster large = jpegtest::pattern(64, 64, 1, 8, 14);
-    OpenedSample reduced(jpegImage("C5", 32, 32, 1, 8, 'B', {jpegtest::encode(large, lossless(8))}));
+    OpenedSample reduced(jpegImage("C5", 32, 32, 32, 32, 1, 8, 'B', {jpegtest::encode(large, lossless(8))}));
     const std::vector<uint16_t> down = bandOf(reduced, 0, 0, 0);
     ASSERT_EQ(down.size(), 32u * 32u);
     for (int y = 0; y < 32; ++y)
@@ -343,7 +337,8 @@ TEST(JpegResampling, StreamsOfAnotherSizeFitTheirBlock) {
 
     // Two-byte samples keep only their low byte, sign-extended, when columns are resampled.
     const Raster deep = jpegtest::pattern(12, 16, 1, 12, 15);
-    OpenedSample narrowed(jpegImage("C5", 16, 16, 1, 12, 'B', {jpegtest::encode(deep, lossless(12))}));
+    OpenedSample narrowed(
+        jpegImage("C5", 16, 16, 16, 16, 1, 12, 'B', {jpegtest::encode(deep, lossless(12))}));
     const std::vector<uint16_t> wide = bandOf(narrowed, 0, 0, 0);
     const std::vector<int> columns = CBlockResampler::indexMap(16, 12);
     ASSERT_EQ(wide.size(), 256u);
@@ -365,9 +360,8 @@ std::string bigEndian16(unsigned value) {
 nitfsample::Image mappedImage(const Raster& raster, unsigned short amplitudeOffset, const std::string& tre) {
     Coding coding = lossless(12);
     coding.app6 = {jpegtest::amplitudeMarker(amplitudeOffset)};
-    nitfsample::Image image = jpegImage("C5", 0, 0, 1, 12, 'B', {jpegtest::encode(raster, coding)});
-    image.cols = raster.width;
-    image.rows = raster.height;
+    nitfsample::Image image =
+        jpegImage("C5", raster.width, raster.height, 0, 0, 1, 12, 'B', {jpegtest::encode(raster, coding)});
     image.ixshd = {{"IOMAPA", tre}};
     return image;
 }
@@ -440,9 +434,7 @@ TEST(JpegAmplitudeMapping, OnlyTheNitfAmplitudeMarkerCounts) {
     std::string lower = jpegtest::amplitudeMarker(321);
     lower.replace(0, 4, "nitf");
     coding.app6 = {nitf, "FOREIGN", "NITF0001.A", lower};
-    nitfsample::Image image = jpegImage("C5", 0, 0, 1, 12, 'B', {jpegtest::encode(input, coding)});
-    image.cols = 8;
-    image.rows = 4;
+    nitfsample::Image image = jpegImage("C5", 8, 4, 0, 0, 1, 12, 'B', {jpegtest::encode(input, coding)});
     OpenedSample file(image);
     EXPECT_EQ(bandOf(file, 0, 0, 0), input.samples) << "no IOMAPA: nothing to map";
     EXPECT_TRUE(jpegOf(file).hasNitfApp6());
@@ -480,11 +472,9 @@ TEST(JpegDamage, CorruptStreamsRaiseAndLeaveTheSourceUsable) {
     for (const Case& c : cases) {
         // The damaged stream comes first, a good one second: both blocks must behave.
         nitfsample::Image image = jpegImage(
-            "M3", 0, 16, 1, c.nbpp, 'B',
+            "M3", 32, 16, 16, 16, 1, c.nbpp, 'B',
             {c.bytes,
              c.nbpp == 8 ? stream : jpegtest::encode(jpegtest::pattern(16, 16, 1, 12), lossless(12))});
-        image.cols = 32;
-        image.rows = 16;
         OpenedSample file(image);
         const int bytes = c.nbpp == 8 ? 1 : 2;
         std::vector<char> buffer(16 * 16 * bytes, 'x');
@@ -500,8 +490,7 @@ TEST(JpegDamage, CorruptStreamsRaiseAndLeaveTheSourceUsable) {
 
 TEST(JpegDamage, ReadsOutsideTheImageOrItsRowsAreRefused) {
     const Raster raster = jpegtest::pattern(16, 16, 1, 12, 22);
-    nitfsample::Image image = jpegImage("C5", 16, 16, 1, 12, 'B', {jpegtest::encode(raster, lossless(12))});
-    OpenedSample file(image);
+    OpenedSample file(jpegImage("C5", 16, 16, 16, 16, 1, 12, 'B', {jpegtest::encode(raster, lossless(12))}));
     std::vector<char> buffer(16 * 16 * 2);
     EXPECT_THROW(jpegOf(file).readTileNonInterleaved(&file.reader(), buffer.data(), 24, 0, 0, 0),
                  vexo::Exception)
