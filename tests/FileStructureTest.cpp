@@ -34,15 +34,6 @@ File oneImageFile(const std::string& version = "NITF02.10") {
     return file;
 }
 
-template <typename Call> std::string messageOf(Call call) {
-    try {
-        call();
-    } catch (const vexo::Exception& e) {
-        return e.what();
-    }
-    return "<no exception>";
-}
-
 } // namespace
 
 TEST(FileStructure, VersionsAreDetectedFromTheFirstNineBytes) {
@@ -59,7 +50,7 @@ TEST(FileStructure, VersionsAreDetectedFromTheFirstNineBytes) {
     }
     TempFile unknown("GARBAGE-FILE-CONTENTS");
     CNitfFileReader reader;
-    EXPECT_EQ(messageOf([&] { reader.open(unknown.path().c_str()); }), "Unknown NITF file version");
+    EXPECT_EQ(refusalOf([&] { reader.open(unknown.path().c_str()); }), "Unknown NITF file version");
     EXPECT_EQ(reader.open("/nonexistent/file.ntf"), nullptr);
 
     // An NSIF01.01 file is read with the 2.1 header; NITF 1.1 is recognised and shows nothing.
@@ -277,6 +268,6 @@ TEST(FileStructure, StreamingHeaderReplacesTheHeader) {
     File partial = oneImageFile();
     partial.fields["FL"] = "999999999999";
     partial.des.push_back(nitfsample::streamingFileHeader(std::string(100, ' ')));
-    EXPECT_EQ(messageOf([&] { OpenedSample broken(partial); }),
+    EXPECT_EQ(refusalOf([&] { OpenedSample broken(partial); }),
               "Only a file header replacement is supported for a streaming file header.");
 }

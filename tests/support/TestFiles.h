@@ -72,6 +72,16 @@ std::string readWholeFile(const std::string& path);
 // receives its standard output.
 int runTool(const std::string& arguments, std::string* output = nullptr);
 
+// The message of the vexo::Exception that `call` throws, or "" when it returns.
+template <typename Call> std::string refusalOf(Call call) {
+    try {
+        call();
+    } catch (const vexo::Exception& e) {
+        return e.what();
+    }
+    return "";
+}
+
 // Whether a command of that name is installed.
 bool haveCommand(const std::string& name);
 
