@@ -155,16 +155,8 @@ TEST(ImageSubheader, CommentsCornersTitleAndLevels) {
     EXPECT_EQ(subheader.getImageAttachment(), 0) << "the attachment level is looked up as LALVL";
 }
 
-TEST(ImageSubheader, StorageLengthAndWriting) {
-    // Blank ICORDS: no IGEOLO, and the written layout starts from 375 bytes.
-    Image plain = small();
-    ReadImage read(plain);
-    EXPECT_EQ(read.subheader->getGeorefSource().getCoordinateType(), CNitfGeorefInfo::eCoordinatesNone);
-    EXPECT_EQ(read.subheader->computeStorageLength(), 375 + 1 + 13 + 45 + 5);
-    ByteStream out("");
-    read.subheader->write(out);
-    EXPECT_EQ(DKFTell(out), read.subheader->computeStorageLength());
-
+// (Sub-headers read from the corpus are written back at their storage length in the record round trips.)
+TEST(ImageSubheader, ExtendedAreaTresAreWrittenToTheUserArea) {
     // TREs read from the extended area are written into the user-defined area, and the old extended length is
     // still counted (the over-count is kept).
     Image tagged = small();
@@ -175,11 +167,9 @@ TEST(ImageSubheader, StorageLengthAndWriting) {
     EXPECT_EQ(subheader.getTaggedRecords().front()->getSource(), CNitfTag::eTagSourceImage);
     ByteStream written("");
     subheader.write(written);
-    long long length = DKFTell(written);
-    EXPECT_EQ(subheader.computeStorageLength(), length + 19) << "over-counted by the old IXSHDL";
-    std::string bytes(static_cast<size_t>(length), '\0');
-    DKFSeek64(written, 0, SEEK_SET);
-    DKFRead(&bytes[0], 1, bytes.size(), written);
+    const std::string bytes = written.contents();
+    EXPECT_EQ(subheader.computeStorageLength(), static_cast<long long>(bytes.size()) + 19)
+        << "over-counted by the old IXSHDL";
     EXPECT_EQ(bytes.substr(bytes.size() - 29), "00019000ABCDEF00005" + std::string(5, '\0') + "00000")
         << "UDIDL, UDOFL, the TRE header and its skipped data, then IXSHDL 00000";
 

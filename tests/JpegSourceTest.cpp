@@ -137,21 +137,6 @@ TEST(JpegMarkerScan, FindsStreamStartsButNotThoseInsideComments) {
     EXPECT_EQ(CNitfImageSourceJpeg::findStreamStarts(stream, 0, 2 * 65536, 100).size(), 4u);
 }
 
-TEST(JpegSource, CommentWithStartPatternDoesNotSplitABlock) {
-    // Unmasked blocks are found by scanning: a comment holding the start pattern must not add a block.
-    Coding coding = lossless(8);
-    coding.comments = {std::string("note \xFF\xD8 inside", 15)};
-    std::vector<std::string> streams;
-    std::vector<Raster> quarters;
-    for (int i = 0; i < 4; ++i) {
-        quarters.push_back(jpegtest::pattern(16, 16, 1, 8, i));
-        streams.push_back(jpegtest::encode(quarters.back(), coding));
-    }
-    OpenedSample image(jpegImage("C5", 32, 32, 16, 16, 1, 8, 'B', streams));
-    for (int i = 0; i < 4; ++i)
-        EXPECT_EQ(bandOf(image, i % 2, i / 2, 0), cut(quarters[i])) << "block " << i;
-}
-
 // ---- defaults
 // ---------------------------------------------------------------------------------------------
 
