@@ -124,8 +124,7 @@ TEST(BiLevelHuffman, DamageEndsTheBlockWithWhatWasDecoded) {
         {"VL3 before the start", true, eol + "1" + joined({"0111", "0010"}) + eol + "0" + "0000010",
          BiLevelHuffman::eDamageBadCode, 1},
         {"extension code", true, eol + "1" + firstLine + eol + "0" + "0000001111",
-         BiLevelHuffman::eDamageBadCode, 1},
-    };
+         BiLevelHuffman::eDamageBadCode, 1}};
     for (const Case& c : cases) {
         SCOPED_TRACE(c.what);
         BitWriter out;

@@ -241,8 +241,7 @@ TEST(GeoTiffWriter, CloudOptimizedLayoutWithAveragedOverviews) {
         {"RGB, deflate", {1100, 700, 3, SampleType::UInt8, false}, Compression::Default, false},
         {"two 16-bit planes, zstd", {1100, 700, 2, SampleType::UInt16, true}, Compression::Zstd, false},
         {"float with no-data", {1100, 700, 1, SampleType::Float32, false}, Compression::Deflate, true},
-        {"signed 16-bit with no-data", {1100, 700, 1, SampleType::Int16, true}, Compression::Deflate, true},
-    };
+        {"signed 16-bit with no-data", {1100, 700, 1, SampleType::Int16, true}, Compression::Deflate, true}};
     const double noData = -7;
     // Smooth content (a ramp with every 11th sample no-data), so that averages mean something.
     auto contentOf = [noData](SampleType type, bool holes) -> Content {

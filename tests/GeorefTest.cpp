@@ -60,8 +60,7 @@ const WorkedExample kWorkedExamples[] = {
     {CNitfGeorefInfo::eCoordinatesUtmSouth, "327933278155361", -16.666110, 11.750000},
     {CNitfGeorefInfo::eCoordinatesMgrs, "17SKU3308507070", 34.370624, -83.902537},
     {CNitfGeorefInfo::eCoordinatesMgrs, "32KQG9332755361", -16.666110, 11.750000},
-    {CNitfGeorefInfo::eCoordinatesGeocentric, "325900N0850000E", 33.159316, 85.000000},
-};
+    {CNitfGeorefInfo::eCoordinatesGeocentric, "325900N0850000E", 33.159316, 85.000000}};
 
 } // namespace
 
@@ -102,8 +101,7 @@ TEST(GeorefCornerText, MalformedCornersAreRefused) {
         {CNitfGeorefInfo::eCoordinatesMgrs, "17SKI3308507070"}, // nor does row letter I
         {CNitfGeorefInfo::eCoordinatesMgrs, "ZAH330850707070"}, // polar: not this form
         {CNitfGeorefInfo::eCoordinatesUps, "P12345671234567"},
-        {CNitfGeorefInfo::eCoordinatesOther, "440344N1230429W"},
-    };
+        {CNitfGeorefInfo::eCoordinatesOther, "440344N1230429W"}};
     for (const auto& [form, text] : bad) {
         CornerPoint point;
         EXPECT_FALSE(nitf_georef::parseIgeoloCorner(form, text, &point)) << text;
@@ -502,14 +500,12 @@ TEST(GeorefCorpus, IgeoloCornersMatchTheWorkedExamplesAndWriteBack) {
         int corner;
         double latitude, longitude;
     };
-    const Fact facts[] = {
-        {"nitf20/U_3050B.NTF", 0, -16.666111, 11.750000},
-        {"nitf20/U_3050B.NTF", 2, -20.000000, 12.990000},
-        {"jpeg2000/p0_13xa.ntf", 0, 34.370624, -83.902537},
-        {"jpeg2000/p0_13xa.ntf", 2, 34.354086, -83.881424},
-        {"misc/autzen-utm10.ntf", 0, 44.062222, -123.074722},
-        {"misc/20091021203850-01001116-VIS.ntf.r2", 0, 39.804, -84.146},
-    };
+    const Fact facts[] = {{"nitf20/U_3050B.NTF", 0, -16.666111, 11.750000},
+                          {"nitf20/U_3050B.NTF", 2, -20.000000, 12.990000},
+                          {"jpeg2000/p0_13xa.ntf", 0, 34.370624, -83.902537},
+                          {"jpeg2000/p0_13xa.ntf", 2, 34.354086, -83.881424},
+                          {"misc/autzen-utm10.ntf", 0, 44.062222, -123.074722},
+                          {"misc/20091021203850-01001116-VIS.ntf.r2", 0, 39.804, -84.146}};
     int checkedFacts = 0;
     for (const CorpusImage& image : images) {
         SCOPED_TRACE(image.relative + " image " + std::to_string(image.index));

@@ -53,8 +53,7 @@ TEST(ImageMalformed, GeometryBeyondTheFileIsRefused) {
         {"a bi-level bitmap far larger than the file",
          "NPPBH=9999 NPPBV=9999 NBPR=0009 NBPC=0009 NBPP=01 PVTYPE=B", 1, 'B', "larger than the image data"},
         {"no blocks", "NBPR=0000", 1, 'B', "Invalid image geometry"},
-        {"a negative block size", "NPPBV=-001", 1, 'B', "Invalid image geometry"},
-    };
+        {"a negative block size", "NPPBV=-001", 1, 'B', "Invalid image geometry"}};
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
         Image image = smallImage();

@@ -191,21 +191,19 @@ TEST(ImageSourceMasked, PadPixelIsDecodedByPixelValueType) {
         uint64_t code;
         bool has;
         long long value;
-    } cases[] = {
-        {"INT", 8, 8, 0x7F, true, 127},
-        {"INT", 16, 16, 0xFFFE, true, 65534},
-        {"INT", 32, 32, 0xFFFFFFFF, true, 4294967295LL},
-        {"SI", 16, 16, 0xFFFE, true, -2},
-        {"SI", 8, 8, 0x80, true, -128},
-        {"SI", 32, 32, 0x80000000, true, -2147483648LL},
-        {"R", 32, 32, 0x3FC00000, true, 1},  // 1.5f, truncated
-        {"R", 64, 32, 0x3FC00000, false, 0}, // a float code does not describe 64-bit samples
-        {"B", 1, 8, 1, true, 1},
-        {"B", 1, 16, 1, false, 0},
-        {"INT", 32, 24, 0x123456, false, 0},
-        {"C", 64, 32, 1, false, 0},
-        {"INT", 8, 0, 0, false, 0},
-    };
+    } cases[] = {{"INT", 8, 8, 0x7F, true, 127},
+                 {"INT", 16, 16, 0xFFFE, true, 65534},
+                 {"INT", 32, 32, 0xFFFFFFFF, true, 4294967295LL},
+                 {"SI", 16, 16, 0xFFFE, true, -2},
+                 {"SI", 8, 8, 0x80, true, -128},
+                 {"SI", 32, 32, 0x80000000, true, -2147483648LL},
+                 {"R", 32, 32, 0x3FC00000, true, 1},  // 1.5f, truncated
+                 {"R", 64, 32, 0x3FC00000, false, 0}, // a float code does not describe 64-bit samples
+                 {"B", 1, 8, 1, true, 1},
+                 {"B", 1, 16, 1, false, 0},
+                 {"INT", 32, 24, 0x123456, false, 0},
+                 {"C", 64, 32, 1, false, 0},
+                 {"INT", 8, 0, 0, false, 0}};
     for (const Case& c : cases) {
         SCOPED_TRACE(std::string(c.pvtype) + " NBPP " + std::to_string(c.nbpp) + " TPXCDLNTH " +
                      std::to_string(c.codeBits));

@@ -185,8 +185,7 @@ TEST(Jpeg2000Damage, DataThatIsNotJpeg2000IsRefused) {
          "no codestream box"},
         {std::string("\xFF\x4F\xFF\x51\x00\x29", 6) + std::string(40, '\0'), "declares 0 components"},
         {mainHeader(16, 16, 16, 16, 1).substr(0, 30), "does not start with a codestream header"},
-        {mainHeader(16, 16, 16, 16, 1).substr(0, 44), "cut short"},
-    };
+        {mainHeader(16, 16, 16, 16, 1).substr(0, 44), "cut short"}};
     for (const auto& c : cases) {
         OpenedSample sample(c8Image(c.data, 16, 16, 16, 16));
         const std::string refusal = refusalOf([&] { sample.source(); });

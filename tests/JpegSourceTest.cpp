@@ -452,8 +452,7 @@ TEST(JpegDamage, CorruptStreamsRaiseAndLeaveTheSourceUsable) {
         {"8-bit stream in a 12-bit image", stream, 12},
         {"three components in one band", jpegtest::encode(jpegtest::pattern(16, 16, 3, 8), Coding{}), 8},
         {"no tables, no default", jpegtest::removeSegments(stream, 0xDB), 8},
-        {"header only", stream.substr(0, 20), 8},
-    };
+        {"header only", stream.substr(0, 20), 8}};
     for (const Case& c : cases) {
         // The damaged stream comes first, a good one second: both blocks must behave.
         nitfsample::Image image = jpegImage(

@@ -40,7 +40,7 @@ const Entry kBands[] = {
     Bytes("COLOUR", 3, kTyped),
     Unsigned("COUNT", 2, kTyped),
     Text("CORNER", 4, kHole),
-    Text("TAIL", 2),
+    Text("TAIL", 2)
 };
 // A binary record as the RPF sections are: numbers of every width, a double, a float and raw bytes.
 const Entry kBinary[] = {
@@ -53,7 +53,7 @@ const Entry kBinary[] = {
     Bytes("RAW", 3),
     Repeat("ONE"),
         Signed("ITEM", 2),
-    End(),
+    End()
 };
 // clang-format on
 

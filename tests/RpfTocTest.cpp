@@ -229,8 +229,7 @@ TEST(RpfToc, DamagedTablesAreRefusedBeforeTheyAreFollowed) {
         {"a frame of a rectangle that does not exist", frames, 7, 2, "refers to boundary rectangle 7"},
         {"a row outside the grid", frames + 2, 3, 2, "outside the 3 x 2 frames"},
         {"a column outside the grid", frames + 4, 2, 2, "outside the 3 x 2 frames"},
-        {"a grid far larger than its frames", 110 + 124, 60000, 4, "far larger than their 6 frames"},
-    };
+        {"a grid far larger than its frames", 110 + 124, 60000, 4, "far larger than their 6 frames"}};
     for (const Case& c : cases) {
         SCOPED_TRACE(c.what);
         std::string bytes = good;

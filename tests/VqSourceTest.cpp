@@ -219,8 +219,7 @@ TEST(VqSource, DamagedHeadersAreRefusedWithAClearMessage) {
         {"more codes per row than pixels", 4, std::string("\0\0\x01\0", 4), "no usable code grid"},
         {"more code rows than lines", 0, std::string("\x7F\xFF\xFF\xFF", 4), "no usable code grid"},
         {"a lookup table offset far away", 15, std::string("\xFF\xFF\xFF\x00", 4), "The VQ codebook"},
-        {"65535 lookup records", 11, std::string("\xFF\xFF", 2), "The VQ codebook"},
-    };
+        {"65535 lookup records", 11, std::string("\xFF\xFF", 2), "The VQ codebook"}};
     for (const Case& c : cases) {
         SCOPED_TRACE(c.what);
         nitfsample::Image image = good;
