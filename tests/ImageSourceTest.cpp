@@ -292,31 +292,8 @@ TEST(ImageSourceBitmap, RowsAreSampledAndAPadOfOneInvertsThem) {
     }
 }
 
-TEST(ImageSourceInterleaving, ConversionsMoveWholeSamplesAndRowToBandPacksRows) {
-    // Two 16-bit bands of 2 x 2 samples, planes one after the other, into pixel-interleaved rows 10 bytes
-    // apart.
-    std::vector<char> planes = {0, 1, 0, 2, 0, 3, 0, 4, 1, 1, 1, 2, 1, 3, 1, 4};
-    std::vector<char> pixels(20, 'x');
-    CNitfImageSource::deinterleaveBandToPixel(pixels.data(), 10, planes.data(), 2, 2, 2, 16);
-    EXPECT_EQ(std::string(pixels.data(), 10), std::string("\0\1\1\1\0\2\1\2xx", 10));
-    EXPECT_EQ(std::string(pixels.data() + 10, 8), std::string("\0\3\1\3\0\4\1\4", 8));
-
-    // And back: band 1 of the interleaved rows.
-    std::vector<char> band(8, 'y');
-    CNitfImageSource::deinterleavePixelToBand(band.data(), 4, pixels.data(), 1, 2, 2, 16, 1);
-    EXPECT_EQ(std::string(band.data(), 4), std::string("\1\1\1\2", 4));
-    // Three 8-bit bands (the common RGB case) with a destination stride.
-    const char rgb[] = "RGBrgbRGBrgb";
-    std::vector<char> green(6, '.');
-    CNitfImageSource::deinterleavePixelToBand(green.data(), 3, const_cast<char*>(rgb), 2, 2, 3, 8, 1);
-    EXPECT_EQ(std::string(green.data(), 6), "Gg.Gg.");
-
-    // Row-interleaved: the destination stride is not used, rows come out packed.
-    const char rows[] = "aaAAbbBB"; // row 0: band 0 "aa", band 1 "AA"; row 1: "bb", "BB"
-    std::vector<char> packed(8, '-');
-    CNitfImageSource::deinterleaveRowToBand(packed.data(), 6, const_cast<char*>(rows), 2, 2, 2, 8, 1);
-    EXPECT_EQ(std::string(packed.data(), 8), "AABB----");
-}
+// (The interleaving conversions are checked by every interleaved and band read above and by the region
+// reader's.)
 
 TEST(ImageSource, WriteabilityLevelsAndTypes) {
     const struct {

@@ -65,19 +65,6 @@ TEST(SegmentRecords, DecimalFieldsAndTheirLimits) {
     EXPECT_EQ(out.contents(), "000042    4200-5012000000000ABCDEAB  ");
 }
 
-TEST(SegmentRecords, BinaryFieldsAreBigEndian) {
-    ByteStream out("");
-    CDataStreamWrite writer(out);
-    writer.writeUint16(0x0102);
-    writer.writeInt32(0x03040506);
-    EXPECT_EQ(out.contents(), std::string("\x01\x02\x03\x04\x05\x06", 6));
-
-    DKFSeek64(out, 0, SEEK_SET);
-    CDataStreamRead reader(out);
-    EXPECT_EQ(reader.readUint16(), 0x0102);
-    EXPECT_EQ(reader.readInt32(), 0x03040506);
-}
-
 TEST(SegmentRecords, LargeFieldsMustFitInTheFile) {
     ByteStream in(std::string(100, 'A'));
     CDataStreamRead reader(in);

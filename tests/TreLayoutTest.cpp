@@ -102,28 +102,8 @@ TEST(TreLayouts, EngineeringRecordsSizeTheirOwnFields) {
     EXPECT_EQ(field(*records, "ENGDATA_2"), "HELLO");
 }
 
-TEST(TreLayouts, AmplitudeMappingForms) {
-    auto shift = parseTre("IOMAPA", joined({"0010", "04"}));
-    EXPECT_EQ(shift->getReadLength(), 6);
-    EXPECT_EQ(field(*shift, "S2"), "04");
-    EXPECT_FALSE(hasField(*shift, "S1"));
-    EXPECT_FALSE(hasField(*shift, "TABLE_ID"));
-
-    std::string table = joined({"0011", "01", "01", "02"});
-    for (int i = 0; i < 4096; ++i)
-        table += bigEndian(4095 - i, 2);
-    auto lookup = parseTre("IOMAPA", table);
-    EXPECT_EQ(lookup->getReadLength(), 8202);
-    EXPECT_EQ(lookup->getProperties().size(), 4096u + 5u);
-    EXPECT_EQ(field(*lookup, "OUTPUT_MAP_VALUE_0", 2), bigEndian(4095, 2));
-    EXPECT_EQ(field(*lookup, "OUTPUT_MAP_VALUE_1", 2), bigEndian(4094, 2));
-    EXPECT_TRUE(hasField(*lookup, "OUTPUT_MAP_VALUE_4095"));
-    EXPECT_FALSE(hasField(*lookup, "OUTPUT_MAP_VALUE_4096"));
-
-    auto logarithmic = parseTre("IOMAPA", joined({"0012", "01", "00", "00", "002", "128"}));
-    EXPECT_EQ(logarithmic->getReadLength(), 16);
-    EXPECT_EQ(field(*logarithmic, "R_FRACTION"), "128");
-
+// (The shift, table and logarithmic forms are read by the JPEG amplitude mapping tests.)
+TEST(TreLayouts, AmplitudeMappingPolynomialForms) {
     std::string coefficients(72, '\x3F');
     auto polynomial =
         parseTre("IOMAPA", joined({"0013", "01", "00", "00", "3", "1000", "2000"}) + coefficients);
