@@ -165,6 +165,13 @@ std::string sha(const Plane& plane) {
     return Sha256::of(std::string(plane.begin(), plane.end()));
 }
 
+TiffOptions cogOf(int tileSize) {
+    TiffOptions options;
+    options.cog = true;
+    options.tileSize = tileSize;
+    return options;
+}
+
 GeoReference geographic() {
     GeoReference geo;
     geo.system = GeoReference::System::Geographic;
@@ -265,9 +272,7 @@ TEST(GeoTiffWriter, CloudOptimizedLayoutWithAveragedOverviews) {
     std::vector<std::vector<std::vector<std::string>>> expected; // case, band, level
     for (const Case& c : cases) {
         SyntheticRaster raster(c.format, contentOf(c.format.type, c.noData), 0, 256);
-        TiffOptions options;
-        options.cog = true;
-        options.tileSize = 256;
+        TiffOptions options = cogOf(256);
         options.compression = c.compression;
         options.hasNoData = c.noData;
         options.noData = noData;
@@ -331,9 +336,7 @@ TEST(GeoTiffWriter, ThreadsWriteTheSameFile) {
     std::string first;
     for (int threads : {1, 3}) {
         SyntheticRaster raster(format, patternContent(SampleType::UInt16));
-        TiffOptions options;
-        options.cog = true;
-        options.tileSize = 128;
+        TiffOptions options = cogOf(128);
         options.threads = threads;
         TempFile file("", ".tif");
         ASSERT_NO_THROW(writeGeoTiff(file.path(), raster, geographic(), options));
@@ -352,11 +355,8 @@ TEST(GeoTiffWriter, ReducedResolutionsComeFromTheSource) {
         *out = static_cast<unsigned char>(level == 0 ? (row + col) % 256 : 40 * level + (row % 2) * 10);
     };
     SyntheticRaster raster(format, content, 2, 128);
-    TiffOptions options;
-    options.cog = true;
-    options.tileSize = 128;
     TempFile file("", ".tif");
-    ASSERT_NO_THROW(writeGeoTiff(file.path(), raster, GeoReference(), options));
+    ASSERT_NO_THROW(writeGeoTiff(file.path(), raster, GeoReference(), cogOf(128)));
     EXPECT_EQ(raster.rowsRead(0), 1000);
     EXPECT_EQ(raster.rowsRead(1), 500);
     EXPECT_EQ(raster.rowsRead(2), 250);
@@ -386,9 +386,7 @@ TEST(GeoTiffWriter, TiePointsRpcColourMapAndNoData) {
     RasterFormat format{600, 400, 1, SampleType::UInt8, false};
     Content content = [](int, int, int row, int col, unsigned char* out) { *out = (row / 3 + col / 5) % 4; };
     SyntheticRaster raster(format, content);
-    TiffOptions options;
-    options.cog = true;
-    options.tileSize = 256;
+    TiffOptions options = cogOf(256);
     options.palette = {255, 0, 0, 0, 255, 0, 0, 0, 255, 250, 250, 250};
     options.hasNoData = true;
     options.noData = 3;
@@ -401,10 +399,8 @@ TEST(GeoTiffWriter, TiePointsRpcColourMapAndNoData) {
     EXPECT_EQ(tif["gcp_epsg"], 32617);
     EXPECT_TRUE(tif["geotransform"].is_null());
     for (size_t i = 0; i < 4; ++i) {
-        EXPECT_EQ(tif["gcps"][i][0], geo.tiePoints[i].col);
-        EXPECT_EQ(tif["gcps"][i][1], geo.tiePoints[i].row);
-        EXPECT_EQ(tif["gcps"][i][2], geo.tiePoints[i].x);
-        EXPECT_EQ(tif["gcps"][i][3], geo.tiePoints[i].y);
+        const GeoReference::TiePoint& p = geo.tiePoints[i];
+        EXPECT_EQ(tif["gcps"][i], nlohmann::json::array({p.col, p.row, p.x, p.y}));
     }
     // Offsets and scales first, then the coefficients.
     EXPECT_EQ(std::stod(tif["rpc"]["LINE_OFF"].get<std::string>()), 102);
@@ -433,9 +429,8 @@ TEST(GeoTiffWriter, FailuresThrowAndLeaveNoFile) {
     for (bool cog : {false, true}) {
         SyntheticRaster raster(format, patternContent(SampleType::UInt8), 0, 256);
         raster.failAtRow(200);
-        TiffOptions options;
+        TiffOptions options = cogOf(128);
         options.cog = cog;
-        options.tileSize = 128;
         EXPECT_THROW(writeGeoTiff(path, raster, GeoReference(), options), std::runtime_error);
         EXPECT_EQ(readWholeFile(path), "") << "the output is removed";
         EXPECT_FALSE(std::ifstream(path).good());

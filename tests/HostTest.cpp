@@ -350,15 +350,3 @@ TEST(HostProjection, UtmHemispheresGeocentricLatitudeAndGeosysTexts) {
     EXPECT_EQ(ProjToGeocoded(&none, 0, 0, &latitude, &longitude), -1);
     EXPECT_EQ(EncodeGeosys(&none, text, sizeof text), -1);
 }
-
-TEST(HostProjection, ImagesAcrossTheAntimeridianStepEast) {
-    ProjInfo_t info;
-    InitProjInfo(&info);
-    ASSERT_EQ(DecodeGeosys(&info, "GEO"), 0);
-    // 174.375E to 168.75W over 1536 columns: 16.875 degrees east, not 343 degrees west.
-    const double x[4] = {174.375, -168.75, -168.75, 174.375}, y[4] = {51.9, 51.9, 41.5, 41.5};
-    ASSERT_EQ(ProjSetGeoreferenceFromCorners(&info, x, y, 1536, 1536), 0);
-    EXPECT_EQ(info.hasAffine, 1);
-    EXPECT_NEAR(info.affine[1], 16.875 / 1535, 1e-12);
-    EXPECT_EQ(info.cornerX[1], -168.75) << "the corners stay as given";
-}
