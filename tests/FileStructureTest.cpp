@@ -9,7 +9,6 @@
 #include "NitfDataExtensionSource.h"
 #include "NitfFileHeaderV21.h"
 #include "NitfImageSubheader.h"
-#include "NitfLabelSource.h"
 #include "NitfSymbolSource.h"
 #include "NitfTestFile.h"
 #include "NitfTextSource.h"
@@ -64,35 +63,13 @@ TEST(FileStructure, VersionsAreDetectedFromTheFirstNineBytes) {
     EXPECT_TRUE(old.header()->getFields().empty());
 }
 
-TEST(FileStructure, SegmentTablesChainFromTheHeaderLength) {
-    ByteStream table(joined({"002000499", "0000000100", "000512", "0000000200"}));
-    std::vector<CNitfHeaderDataPair*> pairs;
-    __int64 fieldBytes = 0;
-    int count = 0;
-    EXPECT_EQ(CNitfFileHeader::readPairs(table, 1000, 3, 6, 10, &pairs, fieldBytes, count), 1311);
-    EXPECT_EQ(count, 2);
-    EXPECT_EQ(fieldBytes, 35);
-    ASSERT_EQ(pairs.size(), 2u);
-    EXPECT_EQ(pairs[0]->getDataOffset(), 1499);
-    EXPECT_EQ(pairs[1]->getHeaderOffset(), 1599);
-    EXPECT_EQ(pairs[1]->getDataOffset(), 2111);
-
-    ByteStream empty("000");
-    std::vector<CNitfHeaderDataPair*> none;
-    EXPECT_EQ(CNitfFileHeader::readPairs(empty, 0, 3, 6, 10, &none, fieldBytes, count), 0);
-    EXPECT_EQ(fieldBytes, 3);
-    EXPECT_TRUE(none.empty());
-
+// (Segment tables are read against the manifest's offsets and lengths, and written back, on the corpus.)
+TEST(FileStructure, SegmentLengthsThatDoNotFitAreWrittenAsNines) {
     ByteStream out("");
     CNitfHeaderDataPair huge(0, 499, 12000000000LL);
     std::vector<CNitfHeaderDataPair*> one{&huge};
     CNitfFileHeader::writePairs(out, 3, 6, 10, &one);
-    DKFSeek64(out, 0, SEEK_SET);
-    char written[20] = {0};
-    DKFRead(written, 1, 19, out);
-    EXPECT_STREQ(written, "0010004999999999999");
-    for (CNitfHeaderDataPair* pair : pairs)
-        delete pair;
+    EXPECT_EQ(out.contents(), "0010004999999999999");
 }
 
 // (The fields, TREs and segments of real files are checked against the corpus manifest.)
@@ -162,15 +139,10 @@ TEST(FileStructure, OsdeAndNitf20Layouts) {
     File old = oneImageFile("NITF02.00");
     old.security.dwng = "999998";
     old.security.devt = "ON EVENT";
-    old.labels.emplace_back();
-    old.labels.back().lid = "LABEL1";
-    old.labels.back().data = "Label text";
     old.des.push_back(nitfsample::treOverflow("UDID", 1, {{"IMTRE1", "abc"}}, "NITF02.00"));
     old.des.back().security.ctlh = "HANDLING";
     OpenedSample sample20(old);
     EXPECT_EQ(field(sample20.header()->getProperties(), "FSDEVT").substr(0, 8), "ON EVENT");
-    std::unique_ptr<CNitfLabelSource> label(sample20.reader().getNewLabelSource(0));
-    EXPECT_EQ(label->getField("LID"), "LABEL1");
     std::unique_ptr<CNitfDataExtensionSource> des(sample20.reader().getNewDataExtensionSource(0));
     EXPECT_TRUE(des->isOverflow());
     EXPECT_EQ(des->getField("DECTLH"), "HANDLING") << "2.0 keeps its own key for control and handling";

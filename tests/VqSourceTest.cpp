@@ -88,23 +88,16 @@ std::string readEverything(const nitfsample::Image& vq) {
 } // namespace
 
 TEST(VqDecoder, EveryCodeLengthAndKernelSizeDecodesItsKernels) {
-    struct Case {
-        int codesPerRow, codeRows, bits, kernelWidth, kernelHeight;
-    };
-    // 4 x 4 kernels with whole vectors of four codes and a remainder; other code lengths and kernel sizes.
-    const Case cases[] = {{8, 8, 12, 4, 4}, {6, 3, 12, 4, 4}, {8, 2, 5, 2, 3}, {7, 2, 8, 1, 1},
-                          {4, 4, 16, 2, 2}, {8, 1, 1, 8, 8},  {4, 2, 3, 4, 4}};
-    for (const Case& c : cases) {
-        Layout layout;
-        layout.codesPerRow = c.codesPerRow;
-        layout.codeRows = c.codeRows;
-        layout.bits = c.bits;
-        layout.kernelWidth = c.kernelWidth;
-        layout.kernelHeight = c.kernelHeight;
-        SCOPED_TRACE(std::to_string(c.bits) + "-bit codes, " + std::to_string(c.codesPerRow) + " x " +
-                     std::to_string(c.codeRows) + " of " + std::to_string(c.kernelWidth) + " x " +
-                     std::to_string(c.kernelHeight));
-        CVqDecoder decoder(c.codesPerRow, c.codeRows, c.bits, c.kernelWidth, c.kernelHeight);
+    // Codes per row and rows, code length, kernel width and height: 4 x 4 kernels with whole vectors of four
+    // codes and a remainder; other code lengths and kernel sizes.
+    const Layout layouts[] = {{8, 8, 12, 4, 4}, {6, 3, 12, 4, 4}, {8, 2, 5, 2, 3}, {7, 2, 8, 1, 1},
+                              {4, 4, 16, 2, 2}, {8, 1, 1, 8, 8},  {4, 2, 3, 4, 4}};
+    for (const Layout& layout : layouts) {
+        SCOPED_TRACE(std::to_string(layout.bits) + "-bit codes, " + std::to_string(layout.codesPerRow) +
+                     " x " + std::to_string(layout.codeRows) + " of " + std::to_string(layout.kernelWidth) +
+                     " x " + std::to_string(layout.kernelHeight));
+        CVqDecoder decoder(layout.codesPerRow, layout.codeRows, layout.bits, layout.kernelWidth,
+                           layout.kernelHeight);
         ASSERT_EQ(decoder.indexBytes(), layout.indexBytes());
         std::string book = vqtest::headerAndCodebook(layout);
         book.erase(0, book.size() - decoder.codebookBytes());
@@ -126,15 +119,9 @@ TEST(VqDecoder, EveryCodeLengthAndKernelSizeDecodesItsKernels) {
 }
 
 TEST(VqSource, BlocksDecodeWithAndWithoutTheCodeGrid) {
-    Layout withGrid;
-    Layout withoutGrid; // only the CADRG grid can do without: 64 x 64 codes of 12 bits
-    withoutGrid.codesPerRow = withoutGrid.codeRows = 64;
-    withoutGrid.withGrid = false;
-    Layout eightBit; // another code length, read bit by bit
-    eightBit.bits = 8;
-    eightBit.kernelWidth = 2;
-    eightBit.kernelHeight = 3;
-    for (const Layout& layout : {withGrid, withoutGrid, eightBit}) {
+    // Only the CADRG grid, 64 x 64 codes of 12 bits, can do without; another code length is read bit by bit.
+    const Layout layouts[] = {{8, 8, 12, 4, 4, true}, {64, 64, 12, 4, 4, false}, {8, 8, 8, 2, 3, true}};
+    for (const Layout& layout : layouts) {
         SCOPED_TRACE(std::to_string(layout.bits) + " bits, grid " + (layout.withGrid ? "given" : "implied"));
         OpenedSample image(vqImage(layout, 2, 2));
         auto* vq = &image.source<CNitfImageSourceVQ>();
