@@ -39,46 +39,6 @@ Image blockedImage(char imode, int nbpp, int bands) {
     return image;
 }
 
-// A C stream over bytes in memory that counts the bytes read from it (unbuffered, so that no read-ahead
-// counts).
-class CountingFile : public CNitfFile {
-public:
-    explicit CountingFile(std::string bytes) : m_bytes(std::move(bytes)) {
-        cookie_io_functions_t io = {onRead, nullptr, onSeek, nullptr};
-        m_fp = fopencookie(this, "rb", io);
-        setvbuf(m_fp, nullptr, _IONBF, 0);
-    }
-    ~CountingFile() override { std::fclose(m_fp); }
-    FILE* getInputStream() override { return m_fp; }
-    FILE* getOutputStream() override { return m_fp; }
-    void close() override {}
-    CNitfFileHeader* getFileHeader() override { return nullptr; }
-
-    long long bytesRead = 0;
-
-private:
-    static ssize_t onRead(void* cookie, char* buffer, size_t size) {
-        CountingFile& self = *static_cast<CountingFile*>(cookie);
-        size_t left = self.m_position < self.m_bytes.size() ? self.m_bytes.size() - self.m_position : 0;
-        size_t count = std::min(size, left);
-        std::memcpy(buffer, self.m_bytes.data() + self.m_position, count);
-        self.m_position += count;
-        self.bytesRead += static_cast<long long>(count);
-        return static_cast<ssize_t>(count);
-    }
-    static int onSeek(void* cookie, off64_t* offset, int whence) {
-        CountingFile& self = *static_cast<CountingFile*>(cookie);
-        off64_t base = whence == SEEK_SET ? 0 : (whence == SEEK_CUR ? self.m_position : self.m_bytes.size());
-        self.m_position = static_cast<size_t>(base + *offset);
-        *offset = static_cast<off64_t>(self.m_position);
-        return 0;
-    }
-
-    std::string m_bytes;
-    size_t m_position = 0;
-    FILE* m_fp;
-};
-
 } // namespace
 
 // (Every interleaving and depth read through the region reader is checked with the region reader.)
@@ -218,34 +178,6 @@ TEST(ImageSourceMasked, PadPixelIsDecodedByPixelValueType) {
         EXPECT_EQ(open.source().hasPadPixel(), c.has);
         EXPECT_EQ(open.source().getPadPixelValue(), c.value);
     }
-}
-
-TEST(ImageSourceBlockCache, PixelInterleavedBlocksAreReadOncePerVisit) {
-    Image image = blockedImage('P', 8, 3);
-    OpenedSample open(image);
-    CountingFile counting(readWholeFile(open.path()));
-    const long long block = open.source().getImageProperties().getTileBufferSize();
-    std::vector<char> buffer(static_cast<size_t>(block));
-    auto read = [&](int band, int x, int y) {
-        EXPECT_TRUE(open.source().readTileNonInterleaved(&counting, buffer.data(), band, x, y));
-        return nitfsample::sampleAt(image, band, y * 8 + 1, x * 16 + 2) ==
-               static_cast<unsigned char>(buffer[16 + 2]);
-    };
-    EXPECT_TRUE(read(0, 0, 0));
-    EXPECT_TRUE(read(1, 0, 0));
-    EXPECT_TRUE(read(2, 0, 0));
-    EXPECT_EQ(counting.bytesRead, block) << "the bands of one block come from one read";
-    for (int x : {1, 0, 1})
-        EXPECT_TRUE(read(2, x, 0));
-    EXPECT_EQ(counting.bytesRead, 4 * block) << "alternating blocks reload the cache";
-
-    // Band-interleaved by block: each band reads its own bytes and no others.
-    Image byBlock = blockedImage('B', 8, 3);
-    OpenedSample b(byBlock);
-    CountingFile direct(readWholeFile(b.path()));
-    for (int band = 0; band < 3; ++band)
-        ASSERT_TRUE(b.source().readTileNonInterleaved(&direct, buffer.data(), band, 1, 1));
-    EXPECT_EQ(direct.bytesRead, 3 * 16 * 8);
 }
 
 TEST(ImageSourceBitmap, RowsAreSampledAndAPadOfOneInvertsThem) {

@@ -9,23 +9,9 @@
 #include "DataStreamWrite.h"
 #include "HostError.h"
 #include "HostFile.h"
-#include "NitfHeaderDataPair.h"
 #include "TestFiles.h"
 
 namespace {} // namespace
-
-TEST(SegmentRecords, PairsLayDataRightAfterTheSubheader) {
-    CNitfHeaderDataPair pair(1000, 439, 65536), empty(0, 499, 0);
-    EXPECT_EQ(pair.getDataOffset(), 1439);
-    EXPECT_EQ(pair.getDataEnd(), 66975);
-    std::vector<CNitfHeaderDataPair*> two{&pair, &empty};
-    EXPECT_EQ(CNitfHeaderDataPair::computeVectorLengths(&two), 439 + 65536 + 499);
-    CNitfHeaderDataPair copy;
-    copy = pair;
-    pair.setOffsets(5, 6, 7);
-    EXPECT_EQ(copy.getDataEnd(), 66975) << "a copy survives changes to the original";
-    EXPECT_EQ(pair.getDataOffset(), 11);
-}
 
 TEST(SegmentRecords, ReadDataAppendsNewlineAndNul) {
     ByteStream in("0123456789");

@@ -54,22 +54,3 @@ TEST(TagList, DamagedAreasEndWithoutLooping) {
     EXPECT_STREQ(list.back()->getIdentifier(), "GOODIE");
     CNitfTag::destroyList(list);
 }
-
-TEST(TagList, IdentifiersAndWriting) {
-    CNitfTag tag;
-    tag.setIdentifier("ACFTB");
-    EXPECT_EQ(std::string(tag.getIdentifier(), 7), std::string("ACFTB\0\0", 7)) << "strncpy fills with NUL";
-    tag.setIdentifier("TOOLONGNAME");
-    EXPECT_STREQ(tag.getIdentifier(), "TOOLON");
-
-    ByteStream out("");
-    CNitfTag record;
-    record.setIdentifier("WRITES");
-    record.setDataLength(123);
-    EXPECT_EQ(record.write(out), 134);
-    EXPECT_EQ(record.getDataOffset(), 11);
-    DKFSeek64(out, 0, SEEK_SET);
-    char header[12] = {0};
-    ASSERT_EQ(DKFRead(header, 1, 11, out), 11u);
-    EXPECT_STREQ(header, "WRITES00123");
-}
