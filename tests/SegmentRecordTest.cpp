@@ -1,33 +1,15 @@
+// Decimal and text fields as the segment records read and write them, and fields too large for the file.
 #include <gtest/gtest.h>
 
 #include <cstring>
 #include <string>
 #include <vector>
 
-#include "DataPointer.h"
 #include "DataStreamRead.h"
 #include "DataStreamWrite.h"
 #include "HostError.h"
 #include "HostFile.h"
 #include "TestFiles.h"
-
-namespace {} // namespace
-
-TEST(SegmentRecords, ReadDataAppendsNewlineAndNul) {
-    ByteStream in("0123456789");
-    char buffer[8];
-    std::memset(buffer, 'x', sizeof buffer);
-    CDataPointer(3, 4).readData(in, buffer);
-    EXPECT_EQ(std::string(buffer, 6), std::string("3456\n\0", 6));
-
-    CDataPointer(5, 0).readData(in, buffer);
-    EXPECT_EQ(std::string(buffer, 2), std::string("\n\0", 2));
-
-    // A pointer running past the end of the file gives zeros, not stale bytes.
-    std::memset(buffer, 'x', sizeof buffer);
-    CDataPointer(8, 4).readData(in, buffer);
-    EXPECT_EQ(std::string(buffer, 6), std::string("89\0\0\n\0", 6));
-}
 
 TEST(SegmentRecords, DecimalFieldsAndTheirLimits) {
     ByteStream in(" 42  7x" + std::string(40, '9'));
