@@ -173,23 +173,6 @@ TEST(VqSource, TwoBandsBandSequentialAndByBlock) {
     }
 }
 
-TEST(VqSource, StorageLengthsOfTheWrittenForm) {
-    nitfsample::Image frame;
-    frame.ic = "C4";
-    frame.comrat = "0.75";
-    frame.rows = frame.cols = 1536;
-    frame.nppbh = frame.nppbv = 256;
-    frame.blockData = {std::string(100, '\0')};
-    OpenedSample file(frame);
-    CNitfImageSourceVQ source(file.header()->getNewImageSubheader(file.reader().getInputStream(), 0),
-                              nullptr);
-    EXPECT_EQ(source.computeVqIndexesPerTileLength(), 6144);
-    EXPECT_EQ(source.computeVqIndexesLength(), 36 * 6144);
-    EXPECT_EQ(source.computeStorageLength(), 36 * 6144 + 65613);
-    EXPECT_EQ(CNitfImageSourceVQ::computeVqHeaderLength() + CNitfImageSourceVQ::computeVqCodebookLength(),
-              65613);
-}
-
 TEST(VqSource, DamagedHeadersAreRefusedWithAClearMessage) {
     Layout layout;
     const nitfsample::Image good = vqImage(layout, 2, 2);
