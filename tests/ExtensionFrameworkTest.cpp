@@ -1,13 +1,12 @@
-// The extension framework: which identifiers are built, metadata export, copies and re-reading.
+// The extension framework: which identifiers are built, copies that share values until one re-reads, and
+// reading through a file.
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <cstring>
 #include <memory>
 #include <string>
 #include <vector>
 
-#include "HostConfig.h"
 #include "NitfExtension.h"
 #include "NitfFile.h"
 #include "NitfTag.h"
@@ -27,17 +26,6 @@ std::unique_ptr<CNitfExtension> build(const char* identifier, long long offset =
 }
 
 const std::string kEvent = padText("HARVEST", 38) + padText("SEASON", 8);
-
-struct MetadataList {
-    char** list = nullptr;
-    ~MetadataList() { DestroyStringList(list); }
-    std::vector<std::string> entries() const {
-        std::vector<std::string> out;
-        for (int i = 0; list && list[i]; ++i)
-            out.push_back(list[i]);
-        return out;
-    }
-};
 
 } // namespace
 
@@ -73,35 +61,6 @@ TEST(ExtensionFramework, BuildChoosesTheParserByIdentifier) {
     EXPECT_FALSE(build("BLOCKA"));
 }
 
-TEST(ExtensionFramework, MetadataKeysAndValues) {
-    auto event = parseTre("PIAEVA", kEvent);
-    const std::string name(38 - 7, ' ');
-
-    MetadataList both, neither;
-    event->asMetadata(both.list, "IMAGE", "_2");
-    event->asMetadata(neither.list, nullptr, nullptr);
-    // Values keep their blanks; entries come in key order.
-    EXPECT_EQ(both.entries(), (std::vector<std::string>{"IMAGE.PIAEVA_2.EVENTNAME=HARVEST" + name,
-                                                        "IMAGE.PIAEVA_2.EVENTTYPE=SEASON  "}));
-    EXPECT_EQ(neither.entries()[1], "PIAEVA.EVENTTYPE=SEASON  ");
-
-    // An empty value (a label of length 0) has a property but no entry; the order is strcmp order, not file
-    // order.
-    std::string engineering =
-        padText("SOURCE", 20) + "001" + "00" + "0001" + "0001" + "A" + "1" + "NA" + padNumber(1, 8) + "X";
-    auto records = parseTre("ENGRDA", engineering);
-    EXPECT_TRUE(hasField(*records, "ENGLBL_1"));
-    MetadataList list;
-    records->asMetadata(list.list, nullptr, nullptr);
-    std::vector<std::string> entries = list.entries();
-    EXPECT_EQ(entries.size(), 10u);
-    EXPECT_TRUE(std::is_sorted(entries.begin(), entries.end()));
-    EXPECT_EQ(
-        std::count_if(entries.begin(), entries.end(),
-                      [](const std::string& entry) { return entry.find("ENGLBL") != std::string::npos; }),
-        0);
-}
-
 TEST(ExtensionFramework, CopiesShareUntilOneRereads) {
     std::string file = kEvent + padText("FLOOD", 38) + padText("DISASTER", 8);
     ByteStream stream(file);
@@ -130,30 +89,6 @@ TEST(ExtensionFramework, CopiesShareUntilOneRereads) {
     auto sharer = std::make_unique<CPIAEVAExtension>(*original);
     original.reset();
     EXPECT_EQ(field(*sharer, "EVENTNAME").substr(0, 7), "HARVEST");
-}
-
-TEST(ExtensionFramework, RereadingReplacesValuesAndKeepsKeys) {
-    std::string one = padText("P", 80) + "AB" + "2" + padNumber(1, 15) + padNumber(2, 15) + padNumber(3, 15) +
-                      padNumber(4, 15);
-    std::string two = padText("Q", 80) + "AB" + "1" + padNumber(9, 15) + padNumber(5, 15) + padNumber(6, 15);
-    ByteStream stream(one + two);
-    CNitfTag tag;
-    tag.setIdentifier("PRJPSB");
-    tag.setDataLength(static_cast<long long>(one.size()));
-    std::unique_ptr<CNitfExtension> projection(CNitfExtension::Build(&tag));
-    projection->readNewInfo(stream.get(), false);
-    EXPECT_EQ(projection->getReadLength(), static_cast<long long>(one.size()));
-    const char* key = projection->getProperties().find(const_cast<char*>("PRJ_1"))->first;
-
-    tag.setDataOffset(static_cast<long long>(one.size()));
-    tag.setDataLength(static_cast<long long>(two.size()));
-    projection->prepare(&tag);
-    projection->readNewInfo(stream.get(), false);
-    EXPECT_EQ(projection->getProperties().find(const_cast<char*>("PRJ_1"))->first, key);
-    EXPECT_EQ(field(*projection, "PRJ_1"), padNumber(9, 15));
-    EXPECT_EQ(field(*projection, "XOR"), padNumber(5, 15));
-    // A name of the first read only stays as it was.
-    EXPECT_EQ(field(*projection, "PRJ_2"), padNumber(2, 15));
 }
 
 // (Nothing is read for a length of 0: see the parsers' robustness tests.)

@@ -170,20 +170,6 @@ TEST(RecordLayout, BinaryRecordsGoThroughTheSerializers) {
     EXPECT_EQ(query.tell(), static_cast<long long>(bytes.size()));
 }
 
-TEST(RecordLayout, TextHoldingControlBytesShowsAsHexadecimal) {
-    NitfField_t text = {"F", eFieldText, 4, 0};
-    CNitfProperty clean;
-    clean.setString("AB  ", 4);
-    EXPECT_EQ(nitfFieldDisplayText(text, &clean), "AB");
-    CNitfProperty binary;
-    binary.setString("A\x01\x00Z", 4);
-    EXPECT_EQ(nitfFieldDisplayText(text, &binary), "4101005A");
-    double number;
-    long long integer;
-    bool isInteger;
-    EXPECT_FALSE(nitfFieldNumber(text, &clean, &number, &integer, &isInteger));
-}
-
 TEST(RecordLayout, RecordsJoinTheSerializableFamily) {
     static const CRecordLayout layout(kBinary);
     nitf::CLayoutRecord record(layout);

@@ -87,11 +87,6 @@ TEST(TocCommand, FrameFilesAreDescribed) {
     EXPECT_EQ(frame.at("colours").size(), 216u);
     EXPECT_EQ(frame.at("transparentCode"), 216);
     EXPECT_NEAR(frame.at("coverage").at("corners").at("upperLeft").at(0).get<double>(), 31.034482759, 1e-9);
-
-    const std::string text = toc("'" + corpusRoot() + "/rpf/0000M033.GN3'", status);
-    EXPECT_EQ(status, 0);
-    EXPECT_NE(text.find("RPF frame 0000M033.GN3"), std::string::npos) << text;
-    EXPECT_NE(text.find("transparent code 216"), std::string::npos) << text;
 }
 
 TEST(TocCommand, OtherFilesAreRefused) {
