@@ -13,7 +13,6 @@
 #include "KeyStore.h"
 #include "NitfField.h"
 #include "RecordLayout.h"
-#include "LayoutRecord.h"
 #include "SerializerFileRaw.h"
 #include "SerializerQuery.h"
 #include "TestFiles.h"
@@ -168,30 +167,4 @@ TEST(RecordLayout, BinaryRecordsGoThroughTheSerializers) {
     layout.serialize(query, values.map);
     EXPECT_EQ(query.tell(), layout.length(values.map));
     EXPECT_EQ(query.tell(), static_cast<long long>(bytes.size()));
-}
-
-TEST(RecordLayout, RecordsJoinTheSerializableFamily) {
-    static const CRecordLayout layout(kBinary);
-    nitf::CLayoutRecord record(layout);
-    SetProperty(record.getFields(), "ONE", new CNitfProperty(std::string("\x01", 1).c_str()));
-    std::string bytes = std::string("\x01", 1) + std::string(2 + 4 + 8 + 8 + 4 + 3 + 2, '\0');
-    // As one object of a larger serialization: the query records where it began and how long it was.
-    nitf::CSerializerQuery query;
-    query.addQuery(&record);
-    query << static_cast<unsigned short>(7);
-    query << record;
-    ASSERT_TRUE(query.getQueryInfo(&record));
-    EXPECT_EQ(query.getQueryInfo(&record)->offset, 2);
-    EXPECT_EQ(query.getQueryInfo(&record)->length, record.length());
-
-    ByteStream out("");
-    nitf::CSerializerFileRaw writer(out, true);
-    writer << record;
-    EXPECT_EQ(out.contents(), bytes);
-    DKFSeek64(out, 0, SEEK_SET);
-    nitf::CLayoutRecord again(layout);
-    nitf::CSerializerFileRaw reader(out, true);
-    reader >> again;
-    EXPECT_EQ(again.length(), static_cast<long long>(bytes.size()));
-    EXPECT_TRUE(FindProperty(again.getFields(), "ITEM_1"));
 }

@@ -134,7 +134,7 @@ TEST(TreLayouts, LayerInformationOfParsedStreams) {
     EXPECT_FALSE(hasField(*original, "NBANDS_I"));
 }
 
-TEST(TreLayouts, FrameOffsetsAndProductGroups) {
+TEST(TreLayouts, FrameOffsets) {
     auto frames =
         parseTre("NBLOCA", bigEndian(0, 4) + bigEndian(3, 4) + bigEndian(1000, 4) + bigEndian(70000, 4));
     EXPECT_EQ(frames->getReadLength(), 16);
@@ -142,18 +142,6 @@ TEST(TreLayouts, FrameOffsetsAndProductGroups) {
     EXPECT_EQ(CNitfExtension::getBinaryValue(FindProperty(frames->getProperties(), "FRAME_3_OFFSET"), 4),
               70000u);
     EXPECT_FALSE(hasField(*frames, "FRAME_4_OFFSET"));
-
-    std::string product = padText("ID", 64) + padText("FM", 32) + "S" + "PC" + padText("PSE", 6) +
-                          padText("PIDNO", 20) + padText("SHORT", 10) + "CD" + "20200101120000" +
-                          padText("MAP", 40) + "01" + padText("TITLE", 40) + "00001" + "002" + "00" + "02" +
-                          padText("ONE", 255) + padText("TWO", 255) + "00" + "00";
-    for (const char* name : {"PIAPRC", "PIAPRD"}) {
-        auto access = parseTre(name, product);
-        EXPECT_EQ(access->getReadLength(), 759) << name;
-        EXPECT_EQ(field(*access, "TPP_1"), "002");
-        EXPECT_EQ(field(*access, "KEYWORD_2"), padText("TWO", 255));
-        EXPECT_FALSE(hasField(*access, "REQORG_1"));
-    }
 }
 
 TEST(TreRobustness, DataCutByTheEndOfTheFile) {
