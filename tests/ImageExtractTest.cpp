@@ -19,8 +19,7 @@
 // independent decoder's, or its documented alternative where the library's rules differ from that decoder's
 // (absent uncompressed blocks read as zeros; 12-bit samples unpacked most significant bit first).
 TEST(ImageCorpus, ExactImagesMatchTheManifest) {
-    if (Manifest::get().empty())
-        GTEST_SKIP() << "no test corpus";
+    SKIP_WITHOUT_CORPUS();
     static const std::set<std::string> exactCodes = {"NC", "NM", "C1", "M1", "C4", "M4", "C8", "M8"};
     int images = 0;
     std::map<std::string, int> verdicts;
@@ -119,9 +118,8 @@ TEST(ExtractTool, WritesCanonicalSamplesAndPictures) {
 // A CADRG frame as a picture: its colour table as the palette, absent subframes (the pad pixel, the first
 // code past the 216 colours) transparent.
 TEST(ExtractTool, CadrgFramesAreColouredWithNoDataClear) {
+    SKIP_WITHOUT_CORPUS();
     const std::string root = corpusRoot();
-    if (root.empty())
-        GTEST_SKIP() << "no test corpus";
     TempFile picture("", ".png");
     ASSERT_EQ(runTool("extract " + root + "/rpf/0000M033.GN3 -f png -o " + picture.path()), 0);
     const std::string png = picture.read();

@@ -50,9 +50,8 @@ void checkTres(const json& expected, const json& actual, bool fileHeaderOnly, co
 } // namespace
 
 TEST(InfoCommand, JsonMatchesTheManifestForEveryCorpusFile) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
     static const json none = json::array();
     int files = 0, summaries = 0, orderedTres = 0;
     for (const CorpusFile& file : manifest.wellFormed()) {
@@ -169,9 +168,8 @@ TEST(InfoCommand, HeaderFieldsInFileOrderBinaryFieldsAsNumbersAndErrorsOnStderr)
 // Where images lie: corners in decimal degrees and the projection record beside the raw IGEOLO, and an RPF
 // frame's own description.
 TEST(InfoCommand, ImagesCarryTheirGeoreferencingAndFramesTheirRpfDescription) {
+    SKIP_WITHOUT_CORPUS();
     const std::string root = corpusRoot();
-    if (root.empty())
-        GTEST_SKIP() << "no test corpus";
     const json frame = json::parse(infoOf(root + "/rpf/0000M033.GN3"))["images"][0];
     const json& place = frame["georeferencing"];
     EXPECT_EQ(place["corner_source"], "RPF coverage") << place.dump();

@@ -54,9 +54,8 @@ std::vector<std::vector<int32_t>> ycbcrToRgb(const wholesamples::Image& image) {
 } // namespace
 
 TEST(Jpeg2000Corpus, EveryJpeg2000ImageDecodes) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
     std::map<std::string, int> verdicts;
     for (const CorpusFile& corpusFile : manifest.files()) {
         for (const nlohmann::json& image : corpusFile.entry->value("images", nlohmann::json::array())) {
@@ -146,9 +145,8 @@ bool readPgx(const std::string& path, Pgx& pgx) {
 // headers) against OpenJPEG's own command-line decoder, component by component: a band on the image grid is
 // its component exactly; a sub-sampled component is replicated over the pixels its samples cover.
 TEST(Jpeg2000Corpus, ImagesWithoutReferencePixelsMatchTheOpenJpegTool) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
     if (!haveCommand("opj_decompress"))
         GTEST_SKIP() << "opj_decompress is not installed";
     int checked = 0;

@@ -134,9 +134,8 @@ void checkImage(const CorpusFile& file, CNitfFileHeader& header, FILE* in, int i
 } // namespace
 
 TEST(RecordRoundTrip, EveryCorpusImageSubheaderWritesItsStorageLengthAndReadsBack) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
     Counts counts;
     for (const CorpusFile& file : manifest.wellFormed()) {
         CNitfFileReader reader;
@@ -156,9 +155,8 @@ TEST(RecordRoundTrip, EveryCorpusImageSubheaderWritesItsStorageLengthAndReadsBac
 }
 
 TEST(RecordRoundTrip, EveryCorpusFileHeaderWritesItsStorageLengthAndReadsBack) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
     int written = 0, identical = 0;
     for (const CorpusFile& file : manifest.wellFormed()) {
         SCOPED_TRACE(file.relative);

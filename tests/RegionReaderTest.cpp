@@ -195,9 +195,8 @@ TEST(RegionReader, TwelveAndSixteenBitJpegComeOutCanonical) {
 // For random windows and band subsets of the corpus's decodable images, the region reader gives exactly the
 // matching part of the whole image.
 TEST(RegionReaderCorpus, WindowsAreCutsOfTheWholeImage) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
     std::mt19937 random(11);
     int images = 0;
     for (const CorpusFile& file : manifest.wellFormed()) {

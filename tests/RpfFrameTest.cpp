@@ -44,8 +44,7 @@ std::pair<double, double> corner(const std::string& igeolo, int index) {
 } // namespace
 
 TEST(RpfFrame, CorpusFramesDescribeThemselves) {
-    if (Manifest::get().empty())
-        GTEST_SKIP() << "no test corpus";
+    SKIP_WITHOUT_CORPUS();
     for (const char* relative : kFrames) {
         SCOPED_TRACE(relative);
         const nlohmann::json* entry = entryOf(relative);

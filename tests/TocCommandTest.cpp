@@ -76,8 +76,7 @@ TEST(TocCommand, RawAndNitfWrappedTablesListTheirFrames) {
 }
 
 TEST(TocCommand, FrameFilesAreDescribed) {
-    if (corpusRoot().empty())
-        GTEST_SKIP() << "no test corpus";
+    SKIP_WITHOUT_CORPUS();
     int status = 0;
     const json report = json::parse(toc("--json '" + corpusRoot() + "/rpf/001zc013.on1'", status));
     EXPECT_EQ(status, 0);
