@@ -70,11 +70,14 @@ TEST(ExtractTool, WritesCanonicalSamplesAndPictures) {
     image.imode = 'S';
     TempFile input(nitfsample::build(fileOf(image)));
     TempFile output("", ".out");
+    auto extract = [&](const std::string& options) {
+        return runTool("extract " + input.path() + " " + options + " -o " + output.path());
+    };
 
-    ASSERT_EQ(runTool("extract " + input.path() + " -f raw -o " + output.path()), 0);
+    ASSERT_EQ(extract("-f raw"), 0);
     EXPECT_EQ(output.read(), nitfsample::canonicalBand(image, 0) + nitfsample::canonicalBand(image, 1) +
                                  nitfsample::canonicalBand(image, 2));
-    ASSERT_EQ(runTool("extract " + input.path() + " -i 0 -b 1 -f raw -o " + output.path()), 0);
+    ASSERT_EQ(extract("-i 0 -b 1 -f raw"), 0);
     EXPECT_EQ(output.read(), nitfsample::canonicalBand(image, 1));
 
     // A window of two bands in the order asked for; the same bytes streamed to a pipe.
@@ -85,31 +88,28 @@ TEST(ExtractTool, WritesCanonicalSamplesAndPictures) {
             part += whole.substr((row * 23 + 3) * 2, 10 * 2);
         return part;
     };
-    ASSERT_EQ(
-        runTool("extract " + input.path() + " --window 3,2,10,7 --bands 2,0 -j 2 -f raw -o " + output.path()),
-        0);
+    ASSERT_EQ(extract("--window 3,2,10,7 --bands 2,0 -j 2 -f raw"), 0);
     EXPECT_EQ(output.read(), cut(2) + cut(0));
     ASSERT_EQ(runTool("extract " + input.path() + " --window 3,2,10,7 --bands 2,0 -f raw -o - | cat > " +
                       output.path()),
               0);
     EXPECT_EQ(output.read(), cut(2) + cut(0));
-    EXPECT_EQ(runTool("extract " + input.path() + " --window 20,0,4,1 -f raw -o " + output.path()), 1)
-        << "a window past the edge";
-    EXPECT_EQ(runTool("extract " + input.path() + " --window 1,2,3 -f raw -o " + output.path()), 2);
+    EXPECT_EQ(extract("--window 20,0,4,1 -f raw"), 1) << "a window past the edge";
+    EXPECT_EQ(extract("--window 1,2,3 -f raw"), 2);
     EXPECT_EQ(runTool("extract --help"), 0);
 
-    ASSERT_EQ(runTool("extract " + input.path() + " -f png -o " + output.path()), 0);
+    ASSERT_EQ(extract("-f png"), 0);
     EXPECT_EQ(output.read().substr(0, 8), "\x89PNG\r\n\x1a\n");
-    ASSERT_EQ(runTool("extract " + input.path() + " -f pgm -o " + output.path()), 0);
+    ASSERT_EQ(extract("-f pgm"), 0);
     EXPECT_EQ(output.read().substr(0, 15), "P6\n23 17\n65535\n") << "RGB, 16 bits";
     EXPECT_EQ(output.read().size(), 15u + 23 * 17 * 3 * 2);
-    ASSERT_EQ(runTool("extract " + input.path() + " -b 2 -f pgm -o " + output.path()), 0);
+    ASSERT_EQ(extract("-b 2 -f pgm"), 0);
     EXPECT_EQ(output.read().substr(0, 3), "P5\n");
 
-    EXPECT_EQ(runTool("extract " + input.path() + " -f bmp -o " + output.path()), 2);
+    EXPECT_EQ(extract("-f bmp"), 2);
     EXPECT_EQ(runTool("extract " + input.path()), 2);
-    EXPECT_EQ(runTool("extract " + input.path() + " -b 3 -f raw -o " + output.path()), 1);
-    EXPECT_EQ(runTool("extract " + input.path() + " -i 1 -f raw -o " + output.path()), 1);
+    EXPECT_EQ(extract("-b 3 -f raw"), 1);
+    EXPECT_EQ(extract("-i 1 -f raw"), 1);
     std::remove(output.path().c_str());
     EXPECT_EQ(runTool("extract " + input.path() + "-missing -f raw -o " + output.path()), 1);
     EXPECT_FALSE(std::ifstream(output.path()).good()) << "no output is left behind after a failure";
