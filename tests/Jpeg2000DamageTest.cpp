@@ -11,6 +11,7 @@
 #include "J2kStreams.h"
 #include "NitfImageSourceJpeg2000.h"
 #include "NitfTestFile.h"
+#include "TreBytes.h"
 #include "WholeSamples.h"
 
 namespace {
@@ -112,21 +113,16 @@ TEST(Jpeg2000Damage, ACutCodestreamReadsWhatItHolds) {
 
 namespace {
 
-void putBigEndian(std::string& out, size_t at, uint64_t value, int bytes) {
-    for (int i = bytes - 1; i >= 0; --i, value >>= 8)
-        out[at + size_t(i)] = char(value & 0xFF);
-}
-
 // The start of a codestream: SOC and SIZ with `components` 8-bit components, then the end marker.
 std::string mainHeader(uint32_t width, uint32_t height, uint32_t tileWidth, uint32_t tileHeight,
                        int components) {
     std::string out("\xFF\x4F\xFF\x51", 4);
     out.resize(42, '\0');
-    putBigEndian(out, 4, 38 + 3 * components, 2);
+    out.replace(4, 2, bigEndian(38 + 3 * components, 2));
     for (auto [at, value] :
          {std::pair<size_t, uint32_t>{8, width}, {12, height}, {24, tileWidth}, {28, tileHeight}})
-        putBigEndian(out, at, value, 4);
-    putBigEndian(out, 40, components, 2);
+        out.replace(at, 4, bigEndian(value, 4));
+    out.replace(40, 2, bigEndian(components, 2));
     for (int c = 0; c < components; ++c)
         out += std::string("\x07\x01\x01", 3);
     return out + std::string("\xFF\xD9", 2);
@@ -140,7 +136,7 @@ std::string claimingSize(uint32_t width, uint32_t height, uint32_t tileWidth, ui
     std::string codestream = j2ktest::encode(coding, j2ktest::pattern(coding));
     for (auto [at, value] :
          {std::pair<size_t, uint32_t>{8, width}, {12, height}, {24, tileWidth}, {28, tileHeight}})
-        putBigEndian(codestream, at, value, 4);
+        codestream.replace(at, 4, bigEndian(value, 4));
     return codestream;
 }
 

@@ -18,6 +18,7 @@
 #include "RpfTables.h"
 #include "SerializerFileRaw.h"
 #include "TestFiles.h"
+#include "TreBytes.h"
 
 namespace {
 
@@ -61,11 +62,6 @@ void expectBoundaries(CRpfSource& toc, const RpfTestRectangles& rectangles) {
         EXPECT_EQ(describe(*boundaries[n]), describe(rectangles[n]->description));
     }
     CRpfSource::freeRpfBoundaries(boundaries);
-}
-
-void putBigEndian(std::string& bytes, size_t at, unsigned long long value, int width) {
-    for (int i = width - 1; i >= 0; --i, value >>= 8)
-        bytes[at + i] = static_cast<char>(value & 0xFF);
 }
 
 } // namespace
@@ -225,9 +221,9 @@ TEST(RpfToc, DamagedTablesAreRefusedBeforeTheyAreFollowed) {
     for (const Case& c : cases) {
         SCOPED_TRACE(c.what);
         std::string bytes = good;
-        putBigEndian(bytes, c.at, c.value, c.width);
+        bytes.replace(c.at, c.width, bigEndian(c.value, c.width));
         if (std::string(c.what) == "a grid far larger than its frames")
-            putBigEndian(bytes, 110 + 128, 60000, 4);
+            bytes.replace(110 + 128, 4, bigEndian(60000, 4));
         const std::string message = readRaw(bytes);
         EXPECT_NE(message.find(c.message), std::string::npos) << message;
     }
@@ -243,7 +239,7 @@ TEST(RpfToc, TruncatedTablesNeverCrash) {
     EXPECT_EQ(refused, tried);
     // A pathname offset that matches no pathname record leaves that frame without a path.
     std::string bytes = good;
-    putBigEndian(bytes, 387 + 6, 5, 4);
+    bytes.replace(387 + 6, 4, bigEndian(5, 4));
     CRpfSource toc;
     ASSERT_EQ(readRaw(bytes, &toc), "");
     EXPECT_EQ(toc.getToc().frames[0].pathname, -1);
