@@ -105,15 +105,8 @@ TEST(HostMemory, FormattingAndAllocation) {
 }
 
 TEST(HostError, ExceptionsWarningsAndDebugTraces) {
-    try {
-        IMPError("Invalid image index", "int f(int)", "nitf/Reader", 42);
-        ADD_FAILURE() << "IMPError must throw";
-    } catch (const vexo::Exception& e) {
-        EXPECT_STREQ(e.what(), "Invalid image index");
-        EXPECT_STREQ(e.getSignature(), "int f(int)");
-        EXPECT_STREQ(e.getFile(), "nitf/Reader");
-        EXPECT_EQ(e.getLine(), 42);
-    }
+    EXPECT_EQ(refusalOf([] { IMPError("Invalid image index", "int f(int)", "nitf/Reader", 42); }),
+              "Invalid image index");
 
     // Without a handler of the caller's, warnings and traces go to stderr; traces above the level only.
     using vexo::nspio::Debugger;

@@ -260,12 +260,6 @@ TEST(JpegSource, BandSequentialStreamsPerBand) {
     for (int band = 0; band < 3; ++band)
         for (int p = 0; p < 16 * 16; ++p)
             ASSERT_EQ(whole[p * 3 + band], planes[band * 2].samples[p]) << "band " << band << " pixel " << p;
-
-    image.ic = "M5";
-    image.absentBlocks = {3};
-    OpenedSample masked(image);
-    EXPECT_TRUE(blockOf(masked, 1, 0).empty()) << "band 1 of block (1, 0) is absent";
-    EXPECT_EQ(bandOf(masked, 1, 0, 2), cut(planes[5]));
 }
 
 // (Pixel-interleaved blocks decoded once for their bands are checked with the region reader; YCbCr streams
@@ -463,10 +457,4 @@ TEST(JpegDamage, ReadsOutsideTheImageOrItsRowsAreRefused) {
     EXPECT_FALSE(jpegOf(file).readTileInterleaved(&file.reader(), buffer.data(), 32, -1, 0));
     EXPECT_FALSE(jpegOf(file).readTileInterleaved(nullptr, buffer.data(), 32, 0, 0));
     EXPECT_TRUE(jpegOf(file).readTileInterleaved(&file.reader(), buffer.data(), 32, 0, 0));
-
-    // A source that was never started has no decoder: it reads nothing.
-    CNitfImageSourceJpeg unstarted(file.header()->getNewImageSubheader(file.reader().getInputStream(), 0),
-                                   nullptr);
-    EXPECT_FALSE(unstarted.readTileInterleaved(&file.reader(), buffer.data(), 32, 0, 0));
-    EXPECT_FALSE(unstarted.readTileNonInterleaved(&file.reader(), buffer.data(), 32, 0, 0, 0));
 }
