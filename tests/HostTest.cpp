@@ -142,32 +142,6 @@ TEST(HostConfig, MetadataLists) {
     DestroyStringList(list);
 }
 
-// (Degrees, minutes and seconds are rounded and read back with the geographic corner forms.)
-TEST(HostProjection, MgrsRoundTrips) {
-    char mgrs[16];
-    ASSERT_EQ(GeocodedToMGRS(0, 0, 5, mgrs), 0);
-    EXPECT_STREQ(mgrs, "31NAA6602100000");
-
-    // UTM in both hemispheres, and the polar UPS areas, at 1 m (about 1e-5 degree).
-    const double points[][2] = {
-        {0, 0}, {38.8895, -77.0352}, {-33.8568, 151.2153}, {85.5, 40.25}, {-88.1, -120.3}};
-    for (const auto& p : points) {
-        double lat, lon;
-        ASSERT_EQ(GeocodedToMGRS(p[0], p[1], 5, mgrs), 0);
-        ASSERT_EQ(MGRSToGeocoded(mgrs, &lat, &lon), 0) << mgrs;
-        EXPECT_NEAR(lat, p[0], 2e-5) << mgrs;
-        EXPECT_NEAR(lon, p[1], 2e-5 / std::cos(p[0] * M_PI / 180)) << mgrs;
-    }
-    ASSERT_EQ(GeocodedToMGRS(0, 0, 0, mgrs), 0);
-    EXPECT_STREQ(mgrs, "31NAA");
-
-    double lat, lon;
-    EXPECT_EQ(GeocodedToMGRS(100, 0, 5, mgrs), -1);
-    EXPECT_EQ(GeocodedToMGRS(0, 0, 6, mgrs), -1);
-    EXPECT_EQ(MGRSToGeocoded("garbage", &lat, &lon), -1);
-    EXPECT_EQ(MGRSToGeocoded("", &lat, &lon), -1);
-}
-
 TEST(HostFile, SizeOfAReadStreamDoesNotGrowBySeeking) {
     TempFile file(std::string(100, 'x'));
     FILE* fp = DKOpen(file.path().c_str(), DK_MODE_READ_BINARY, nullptr);
@@ -183,6 +157,8 @@ TEST(HostFile, SizeOfAReadStreamDoesNotGrowBySeeking) {
     DKClose(out);
 }
 
+// (Degrees, minutes and seconds, and MGRS references in the zones IGEOLO takes them, are read and written
+// with the georeferencing's corner forms.)
 TEST(HostProjection, CornersGiveAnAffineOnlyForParallelogramsAndPositionsEitherWay) {
     ProjInfo_t info;
     InitProjInfo(&info);
