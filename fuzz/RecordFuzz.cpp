@@ -24,9 +24,7 @@ void check(bool condition) {
 void writeBack(CNitfFileHeader& header, FILE* in) {
     if (header.getVersion() == eNitfVersion11)
         return;
-    std::unique_ptr<FILE, int (*)(FILE*)> out(std::tmpfile(), std::fclose);
-    if (!out)
-        return;
+    ByteStream out("");
     header.write(out.get());
     check(DKFTell(out.get()) == header.computeStorageLength());
     for (int i = 0; i < header.getImageCount(); ++i) {
@@ -49,11 +47,9 @@ void writeBack(CNitfFileHeader& header, FILE* in) {
 } // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-    static const TempFile file;
-    file.write(std::string(reinterpret_cast<const char*>(data), size));
     try {
         CNitfFileReader reader;
-        if (reader.open(file.path().c_str()))
+        if (reader.openMemory(data, size))
             writeBack(*reader.getFileHeader(), reader.getInputStream());
     } catch (const vexo::Exception&) {
         // Refused: a number that does not fit its field, a damaged structure.

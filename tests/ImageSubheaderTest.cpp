@@ -8,23 +8,15 @@
 #include "NitfImageSubheaderV21.h"
 #include "NitfTestFile.h"
 
-using nitfsample::File;
 using nitfsample::Image;
 
 namespace {
 
 // Builds a one-image file and reads the image's sub-header back.
 struct ReadImage {
-    explicit ReadImage(const Image& image, const std::string& version = "NITF02.10")
-        : sample(fileWith(image, version)) {
-        subheader.reset(sample.header()->getNewImageSubheader(sample.reader().getInputStream(), 0));
-    }
-    static File fileWith(const Image& image, const std::string& version) {
-        File file;
-        file.version = version;
-        file.images.push_back(image);
-        return file;
-    }
+    explicit ReadImage(const Image& image)
+        : sample(image),
+          subheader(sample.header()->getNewImageSubheader(sample.reader().getInputStream(), 0)) {}
     std::string field(const char* name) {
         CNitfProperty* value = FindProperty(subheader->getProperties(), name);
         return value ? value->toText() : "<absent>";
