@@ -56,10 +56,6 @@ Page everyRunLength() {
     return runs;
 }
 
-std::string white(size_t pixels) {
-    return std::string(pixels, '\0');
-}
-
 } // namespace
 
 TEST(BiLevelHuffman, DecodesEveryCodingOfEveryPage) {
@@ -135,7 +131,8 @@ TEST(BiLevelHuffman, DamageEndsTheBlockWithWhatWasDecoded) {
         EXPECT_EQ(decoded.result.damagedRow, c.rows);
         const char* row0 = c.bits.find(joined({"0111", "0010"})) != std::string::npos ? "\0\0\1\1\1\1\1\1"
                                                                                       : "\0\0\0\0\1\1\1\1";
-        EXPECT_TRUE(decoded.pixels == (c.rows == 1 ? std::string(row0, 8) + white(16) : white(24)));
+        EXPECT_TRUE(decoded.pixels ==
+                    (c.rows == 1 ? std::string(row0, 8) + std::string(16, '\0') : std::string(24, '\0')));
     }
 }
 

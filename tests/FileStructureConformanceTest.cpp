@@ -8,21 +8,12 @@
 #include "NitfFileReader.h"
 #include "NitfImageSubheader.h"
 #include "NitfSymbolSource.h"
+#include "NitfTestFile.h"
 #include "NitfTextSource.h"
 
 namespace {
 
 using nlohmann::json;
-
-std::string trimmed(std::string text) {
-    text.erase(text.find_last_not_of(' ') + 1);
-    return text;
-}
-
-std::string fieldOf(PropertyMap& map, const char* name) {
-    CNitfProperty* value = FindProperty(map, name);
-    return value ? trimmed(value->toText()) : std::string("<absent>");
-}
 
 // The pairs of one segment type against the manifest's offsets and lengths.
 void checkSegments(const json& expected, CNitfHeaderDataPair* (CNitfFileHeader::*pairAt)(int),
@@ -92,7 +83,7 @@ void checkFile(const CorpusFile& file) {
         std::unique_ptr<CNitfImageSubheader> image(
             header->getNewImageSubheader(reader.getInputStream(), static_cast<int>(i)));
         ASSERT_NE(image, nullptr);
-        EXPECT_EQ(fieldOf(image->getProperties(), "ICAT"), images[i]["ICAT"].get<std::string>());
+        EXPECT_EQ(trimmed(fieldText(image->getProperties(), "ICAT")), images[i]["ICAT"].get<std::string>());
         EXPECT_EQ(image->getCommentCount(), images[i]["NICOM"].get<int>());
         if (images[i].contains("tres"))
             checkTres(images[i]["tres"], image->getTaggedRecords(), CNitfTag::eTagSourceImage, "image");

@@ -19,11 +19,6 @@ using nitfsample::Tre;
 
 namespace {
 
-std::string field(PropertyMap& map, const char* name) {
-    CNitfProperty* value = FindProperty(map, name);
-    return value ? value->toText() : std::string("<absent>");
-}
-
 File oneImageFile(const std::string& version = "NITF02.10") {
     File file;
     file.version = version;
@@ -85,7 +80,7 @@ TEST(FileStructure, HeaderFieldsTresAndSegmentsOfA21File) {
     char title[81];
     sample.header()->getTitle(title);
     EXPECT_STREQ(title, "A TITLE");
-    EXPECT_EQ(field(sample.header()->getProperties(), "FBKGC"), "FF8000")
+    EXPECT_EQ(fieldText(sample.header()->getProperties(), "FBKGC"), "FF8000")
         << "the colour bytes read as hex text";
 
     // User-defined area first, then extended; numbering spans both areas.
@@ -127,14 +122,14 @@ TEST(FileStructure, OsdeAndNitf20Layouts) {
     osde.oid = "ORIGINATOR";
     OpenedSample sample(osde);
     PropertyMap& map = sample.header()->getProperties();
-    EXPECT_EQ(field(map, "OID").substr(0, 10), "ORIGINATOR");
-    EXPECT_EQ(field(map, "FBKGC"), "<absent>");
+    EXPECT_EQ(fieldText(map, "OID").substr(0, 10), "ORIGINATOR");
+    EXPECT_EQ(fieldText(map, "FBKGC"), "<absent>");
     std::unique_ptr<CNitfImageSubheader> image(
         sample.header()->getNewImageSubheader(sample.reader().getInputStream(), 0));
-    EXPECT_NE(field(image->getProperties(), "IINFO"), "<absent>");
-    EXPECT_NE(field(image->getProperties(), "ISCSEC"), "<absent>");
-    EXPECT_EQ(field(image->getProperties(), "ISCLAS"), "<absent>");
-    EXPECT_EQ(field(image->getProperties(), "TGTID"), "<absent>");
+    EXPECT_NE(fieldText(image->getProperties(), "IINFO"), "<absent>");
+    EXPECT_NE(fieldText(image->getProperties(), "ISCSEC"), "<absent>");
+    EXPECT_EQ(fieldText(image->getProperties(), "ISCLAS"), "<absent>");
+    EXPECT_EQ(fieldText(image->getProperties(), "TGTID"), "<absent>");
 
     File old = oneImageFile("NITF02.00");
     old.security.dwng = "999998";
@@ -142,7 +137,7 @@ TEST(FileStructure, OsdeAndNitf20Layouts) {
     old.des.push_back(nitfsample::treOverflow("UDID", 1, {{"IMTRE1", "abc"}}, "NITF02.00"));
     old.des.back().security.ctlh = "HANDLING";
     OpenedSample sample20(old);
-    EXPECT_EQ(field(sample20.header()->getProperties(), "FSDEVT").substr(0, 8), "ON EVENT");
+    EXPECT_EQ(fieldText(sample20.header()->getProperties(), "FSDEVT").substr(0, 8), "ON EVENT");
     std::unique_ptr<CNitfDataExtensionSource> des(sample20.reader().getNewDataExtensionSource(0));
     EXPECT_TRUE(des->isOverflow());
     EXPECT_EQ(des->getField("DECTLH"), "HANDLING") << "2.0 keeps its own key for control and handling";
@@ -214,7 +209,7 @@ TEST(FileStructure, StreamingHeaderReplacesTheHeader) {
     auto* header = dynamic_cast<CNitfFileHeaderV21*>(sample.header());
     ASSERT_NE(header, nullptr);
     EXPECT_TRUE(header->isStreamingReplacement());
-    EXPECT_NE(field(header->getProperties(), "FL"), "999999999999");
+    EXPECT_NE(fieldText(header->getProperties(), "FL"), "999999999999");
     EXPECT_LT(header->getImageHeaderDataPair(0)->getDataLength(), 9999999999LL);
 
     std::unique_ptr<CNitfDataExtensionSource> des(

@@ -17,10 +17,7 @@ struct ReadImage {
     explicit ReadImage(const Image& image)
         : sample(image),
           subheader(sample.header()->getNewImageSubheader(sample.reader().getInputStream(), 0)) {}
-    std::string field(const char* name) {
-        CNitfProperty* value = FindProperty(subheader->getProperties(), name);
-        return value ? value->toText() : "<absent>";
-    }
+    std::string field(const char* name) { return fieldText(subheader->getProperties(), name); }
     OpenedSample sample;
     std::unique_ptr<CNitfImageSubheader> subheader;
 };

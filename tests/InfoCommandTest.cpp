@@ -10,7 +10,7 @@
 #include "NitfExtension.h"
 #include "NitfFileReader.h"
 #include "NitfImageSubheader.h"
-#include "NitfSampleWriter.h"
+#include "NitfTestFile.h"
 #include "TestFiles.h"
 
 namespace {
@@ -23,11 +23,6 @@ std::string infoOf(const std::string& path) {
     std::string output;
     EXPECT_EQ(runTool("info --json '" + path + "'", &output), 0) << path;
     return output;
-}
-
-std::string trimmed(std::string text) {
-    text.erase(text.find_last_not_of(' ') + 1);
-    return text;
 }
 
 void checkTres(const json& expected, const json& actual, bool fileHeaderOnly, const std::string& what) {

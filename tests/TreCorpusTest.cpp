@@ -18,6 +18,7 @@
 #include "NitfImageSubheader.h"
 #include "NitfSymbolSource.h"
 #include "NitfTag.h"
+#include "NitfTestFile.h"
 #include "NitfTextSource.h"
 #include "TestFiles.h"
 
@@ -28,8 +29,7 @@ namespace {
 void parseAll(const std::list<CNitfTag*>& tags, FILE* in, const std::string& where,
               std::map<std::string, int>& parsed) {
     for (const CNitfTag* tag : tags) {
-        std::string name = tag->getIdentifier();
-        name.erase(name.find_last_not_of(' ') + 1);
+        const std::string name = trimmed(tag->getIdentifier());
         CNitfTag trimmed;
         trimmed.setIdentifier(name.c_str());
         trimmed.setDataOffset(tag->getDataOffset());

@@ -8,6 +8,16 @@ nitfsample::File fileOf(const nitfsample::Image& image) {
     return file;
 }
 
+std::string fieldText(PropertyMap& fields, const char* name) {
+    CNitfProperty* value = FindProperty(fields, name);
+    return value ? value->toText() : "<absent>";
+}
+
+std::string trimmed(std::string text) {
+    text.erase(text.find_last_not_of(' ') + 1);
+    return text;
+}
+
 OpenedSample::OpenedSample(const nitfsample::File& file, const std::string& name)
     : m_file(new TempFile(nitfsample::build(file), "-" + name)) {
     if (!m_reader.open(m_file->path().c_str()))

@@ -13,6 +13,10 @@
 // A file of this one image.
 nitfsample::File fileOf(const nitfsample::Image& image);
 
+// The text of field `name` ("<absent>" when there is none), and text without its trailing blanks.
+std::string fieldText(PropertyMap& fields, const char* name);
+std::string trimmed(std::string text);
+
 class OpenedSample {
 public:
     explicit OpenedSample(const nitfsample::File& file, const std::string& name = "sample.ntf");
