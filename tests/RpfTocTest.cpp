@@ -66,17 +66,6 @@ void expectBoundaries(CRpfSource& toc, const RpfTestRectangles& rectangles) {
 
 } // namespace
 
-TEST(RpfToc, GeographicLocationCodes) {
-    EXPECT_EQ(CRpfSource::getGeographicLocation(0, 0), "NGAA00");
-    EXPECT_EQ(CRpfSource::getGeographicLocation(-90, -180), "AAAA00");
-    // Whole degrees within the 15-degree cells, then tenths of a degree of longitude and latitude.
-    EXPECT_EQ(CRpfSource::getGeographicLocation(33.93, 1.99994), "NJBD99");
-    EXPECT_EQ(CRpfSource::getGeographicLocation(28.95, -99.25), "FHFP79");
-    EXPECT_EQ(CRpfSource::getGeographicLocation(-0.3, 0.3), "NFAQ37");
-    // 180 degrees east lies one past the last letter: its terminator.
-    EXPECT_EQ(CRpfSource::getGeographicLocation(0, 180)[0], '\0');
-}
-
 TEST(RpfToc, OneFrameTableHasThePublishedLayout) {
     // One rectangle of one frame beside the A.TOC: 292 bytes, each component where the format puts it.
     RpfTestRectangles rectangles;
