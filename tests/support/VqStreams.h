@@ -6,6 +6,8 @@
 #include <string>
 #include <vector>
 
+#include "TreBytes.h"
+
 namespace vqtest {
 
 // The code grid of a block and how the image data describe it.
@@ -21,11 +23,6 @@ struct Layout {
     size_t indexBytes() const { return static_cast<size_t>(codesPerRow) * codeRows * bits / 8; }
 };
 
-inline void putBigEndian(std::string& out, uint64_t value, int bytes) {
-    for (int i = bytes - 1; i >= 0; --i)
-        out += static_cast<char>((value >> (8 * i)) & 0xFF);
-}
-
 // The pixels of kernel `code` of the codebook.
 inline unsigned char kernelPixel(int code, int row, int col) {
     return static_cast<unsigned char>(code * 13 + (code >> 8) + row * 5 + col * 3);
@@ -35,21 +32,21 @@ inline unsigned char kernelPixel(int code, int row, int col) {
 inline std::string headerAndCodebook(const Layout& layout) {
     std::string out;
     if (layout.withGrid) {
-        putBigEndian(out, layout.codeRows, 4);
-        putBigEndian(out, layout.codesPerRow, 4);
-        putBigEndian(out, layout.bits, 1);
+        out += bigEndian(layout.codeRows, 4);
+        out += bigEndian(layout.codesPerRow, 4);
+        out += bigEndian(layout.bits, 1);
     }
-    putBigEndian(out, 1, 2); // vector quantisation
-    putBigEndian(out, 4, 2); // lookup records
-    putBigEndian(out, 0, 2);
-    putBigEndian(out, 6, 4);
-    putBigEndian(out, 14, 2);
+    out += bigEndian(1, 2); // vector quantisation
+    out += bigEndian(4, 2); // lookup records
+    out += bigEndian(0, 2);
+    out += bigEndian(6, 4);
+    out += bigEndian(14, 2);
     for (int id = 1; id <= 4; ++id) {
-        putBigEndian(out, id, 2);
-        putBigEndian(out, 1u << layout.bits, 4);
-        putBigEndian(out, layout.kernelWidth, 2);
-        putBigEndian(out, 8, 2);
-        putBigEndian(out, 0, 4); // never followed
+        out += bigEndian(id, 2);
+        out += bigEndian(1u << layout.bits, 4);
+        out += bigEndian(layout.kernelWidth, 2);
+        out += bigEndian(8, 2);
+        out += bigEndian(0, 4); // never followed
     }
     for (int row = 0; row < layout.kernelHeight; ++row)
         for (int code = 0; code < (1 << layout.bits); ++code)
