@@ -1,9 +1,8 @@
 // libFuzzer target: the input bytes after two shape bytes are bi-level coded data. The decoder reads them as
 // one block of a width, height and coding the shape bytes choose, into rows at an odd bit offset and spacing,
 // and once more only walking; when the shape asks for it, the same bytes become the blocks of a small C1 or
-// M1 image read as readSample reads it. Damage may be reported or refused
-// with vexo::Exception; a crash, a sanitizer report, a hang, a write outside the rows or results that
-// disagree are findings.
+// M1 image read as readSample reads it. Damage may be reported or refused with vexo::Exception; a crash, a
+// sanitizer report, a hang, a write outside the rows or results that disagree are findings.
 #include <cstdint>
 #include <string>
 #include <vector>
