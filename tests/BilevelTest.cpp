@@ -3,10 +3,8 @@
 // corpus's bi-level images are checked with the other exactly decoded images.)
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
-#include <memory>
 #include <string>
 #include <vector>
 

@@ -2,7 +2,6 @@
 // read) or is refused with a clear message; none passes silently.
 #include <gtest/gtest.h>
 
-#include <cstdlib>
 #include <memory>
 #include <string>
 #include <vector>

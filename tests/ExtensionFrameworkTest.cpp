@@ -2,7 +2,6 @@
 // (Reading through a file, as the JPEG source reads IOMAPA, is checked with the amplitude mapping.)
 #include <gtest/gtest.h>
 
-#include <cstring>
 #include <memory>
 #include <string>
 #include <vector>

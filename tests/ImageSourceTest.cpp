@@ -1,9 +1,6 @@
 // Uncompressed image sources: files laid out by the independent sample writer, read back block by block.
 #include <gtest/gtest.h>
 
-#include <cstdio>
-#include <cstring>
-#include <memory>
 #include <string>
 #include <vector>
 

@@ -3,7 +3,6 @@
 // the image segment.
 #include <gtest/gtest.h>
 
-#include <memory>
 #include <string>
 #include <vector>
 

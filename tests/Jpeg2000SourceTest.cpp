@@ -3,9 +3,6 @@
 // several images in one file, and damaged codestreams.
 #include <gtest/gtest.h>
 
-#include <cstdlib>
-#include <cstring>
-#include <memory>
 #include <string>
 #include <vector>
 

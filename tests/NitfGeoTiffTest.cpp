@@ -2,8 +2,6 @@
 // images of every kind and the corpus's decodable images read back by GDAL, and nitf extract -f tiff.
 #include <gtest/gtest.h>
 
-#include <cmath>
-#include <cstdlib>
 #include <cstring>
 #include <memory>
 #include <string>

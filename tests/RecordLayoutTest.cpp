@@ -3,9 +3,6 @@
 // them.
 #include <gtest/gtest.h>
 
-#include <cstdio>
-#include <cstring>
-#include <memory>
 #include <string>
 
 #include "HostError.h"

@@ -3,7 +3,6 @@
 // against the manifest's colour tables, transparent codes and location codes.
 #include <gtest/gtest.h>
 
-#include <cmath>
 #include <memory>
 #include <string>
 #include <vector>
