@@ -1,38 +1,19 @@
 // libFuzzer target: the input bytes after two shape bytes are bi-level coded data. The decoder reads them as
 // one block of a width, height and coding the shape bytes choose, into rows at an odd bit offset and spacing,
 // and once more only walking; when the shape asks for it, the same bytes become the blocks of a small C1 or
-// M1 image read through the file reader, block by block and as a bitmap. Damage may be reported or refused
-// with vexo::Exception; a crash, a sanitizer report, a hang, a write outside the rows or results that
-// disagree are findings.
+// M1 image read as readSample reads it. Damage may be reported or refused with vexo::Exception; a crash, a
+// sanitizer report, a hang, a write outside the rows or results that disagree are findings.
 #include <cstdint>
-#include <cstdio>
-#include <cstdlib>
-#include <memory>
 #include <string>
-#include <unistd.h>
 #include <vector>
 
 #include "BiLevelHuffman.h"
-#include "HostError.h"
-#include "NitfFileReader.h"
-#include "NitfImageSource.h"
 #include "NitfSampleWriter.h"
+#include "WalkFile.h"
 
 namespace {
 
 const int kWidths[] = {1, 7, 8, 37, 64, 200, 1728, 2560};
-
-const std::string& scratchPath() {
-    static const std::string path = [] {
-        const char* dir = std::getenv("TMPDIR");
-        std::string pattern = std::string(dir && *dir ? dir : "/tmp") + "/nitf-bilevelfuzz-XXXXXX";
-        int fd = mkstemp(&pattern[0]);
-        if (fd >= 0)
-            close(fd);
-        return pattern;
-    }();
-    return path;
-}
 
 void check(bool condition) {
     if (!condition)
@@ -60,7 +41,7 @@ void decodeBlock(const uint8_t* data, size_t size, int width, int rows, bool two
 
 // Two blocks side by side: one coded run of both (found by walking) or, masked, the halves, the second
 // perhaps absent.
-void readImage(uint8_t shape, int width, int rows, const std::string& coded) {
+nitfsample::Image imageOf(uint8_t shape, int width, int rows, const std::string& coded) {
     nitfsample::Image image;
     const bool masked = shape & 0x80;
     image.ic = masked ? "M1" : "C1";
@@ -80,29 +61,7 @@ void readImage(uint8_t shape, int width, int rows, const std::string& coded) {
     } else {
         image.blockData = {coded};
     }
-    nitfsample::File file;
-    file.images.push_back(image);
-    try {
-        nitfsample::write(file, scratchPath());
-    } catch (const std::exception&) {
-        return;
-    }
-    // The name is removed once the file is open, so that no scratch file outlives the run.
-    CNitfFileReader reader;
-    const bool opened = reader.open(scratchPath().c_str()) != nullptr;
-    std::remove(scratchPath().c_str());
-    if (!opened)
-        return;
-    try {
-        std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(0));
-        const CNitfImagePropertiesIF& p = source->getImageProperties();
-        std::vector<char> block(static_cast<size_t>(p.getTileBandReadBufferSize()));
-        for (int x = 0; x < 2; ++x)
-            source->readTileNonInterleaved(&reader, block.data(), 0, x, 0);
-        std::vector<char> bitmap(static_cast<size_t>(rows) * ((2 * width + 7) / 8) + 1);
-        source->readBitmap(bitmap.data(), 1, 0, 2 * width - 1, rows, (2 * width + 7) / 8 * 8, rows);
-    } catch (const vexo::Exception&) {
-    }
+    return image;
 }
 
 } // namespace
@@ -118,6 +77,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     const uint64_t lineBits = width + ((shape >> 4) & 3) * 5;
     decodeBlock(data + 2, size - 2, width, rows, twoDimensional, firstBit, lineBits);
     if (shape & 0x40)
-        readImage(shape, width, rows, std::string(reinterpret_cast<const char*>(data) + 2, size - 2));
+        readSample(
+            imageOf(shape, width, rows, std::string(reinterpret_cast<const char*>(data) + 2, size - 2)));
     return 0;
 }

@@ -6,13 +6,13 @@
 #include <cstdlib>
 #include <memory>
 #include <string>
-#include <unistd.h>
 
 #include "HostError.h"
 #include "HostFile.h"
 #include "NitfFileHeader.h"
 #include "NitfFileReader.h"
 #include "NitfImageSubheader.h"
+#include "TestFiles.h"
 
 namespace {
 
@@ -24,9 +24,7 @@ void check(bool condition) {
 void writeBack(CNitfFileHeader& header, FILE* in) {
     if (header.getVersion() == eNitfVersion11)
         return;
-    std::unique_ptr<FILE, int (*)(FILE*)> out(std::tmpfile(), std::fclose);
-    if (!out)
-        return;
+    ByteStream out("");
     header.write(out.get());
     check(DKFTell(out.get()) == header.computeStorageLength());
     for (int i = 0; i < header.getImageCount(); ++i) {
@@ -49,19 +47,12 @@ void writeBack(CNitfFileHeader& header, FILE* in) {
 } // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-    static const std::string path = "/tmp/nitf-fuzz-record-" + std::to_string(getpid()) + ".ntf";
-    FILE* file = std::fopen(path.c_str(), "wb");
-    if (!file)
-        return 0;
-    std::fwrite(data, 1, size, file);
-    std::fclose(file);
     try {
         CNitfFileReader reader;
-        if (reader.open(path.c_str()))
+        if (reader.openMemory(data, size))
             writeBack(*reader.getFileHeader(), reader.getInputStream());
     } catch (const vexo::Exception&) {
         // Refused: a number that does not fit its field, a damaged structure.
     }
-    std::remove(path.c_str());
     return 0;
 }

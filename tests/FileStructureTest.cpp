@@ -1,6 +1,5 @@
 #include <gtest/gtest.h>
 
-#include <cstring>
 #include <memory>
 #include <string>
 
@@ -9,7 +8,6 @@
 #include "NitfDataExtensionSource.h"
 #include "NitfFileHeaderV21.h"
 #include "NitfImageSubheader.h"
-#include "NitfLabelSource.h"
 #include "NitfSymbolSource.h"
 #include "NitfTestFile.h"
 #include "NitfTextSource.h"
@@ -20,11 +18,6 @@ using nitfsample::Tre;
 
 namespace {
 
-std::string field(PropertyMap& map, const char* name) {
-    CNitfProperty* value = FindProperty(map, name);
-    return value ? value->toText() : std::string("<absent>");
-}
-
 File oneImageFile(const std::string& version = "NITF02.10") {
     File file;
     file.version = version;
@@ -32,15 +25,6 @@ File oneImageFile(const std::string& version = "NITF02.10") {
     file.images.back().rows = 8;
     file.images.back().cols = 8;
     return file;
-}
-
-template <typename Call> std::string messageOf(Call call) {
-    try {
-        call();
-    } catch (const vexo::Exception& e) {
-        return e.what();
-    }
-    return "<no exception>";
 }
 
 } // namespace
@@ -57,18 +41,15 @@ TEST(FileStructure, VersionsAreDetectedFromTheFirstNineBytes) {
         ByteStream in(c.text);
         EXPECT_EQ(CNitfFileHeader::readVersion(in), c.version) << c.text;
     }
-
     TempFile unknown("GARBAGE-FILE-CONTENTS");
     CNitfFileReader reader;
-    EXPECT_EQ(messageOf([&] { reader.open(unknown.path().c_str()); }), "Unknown NITF file version");
-    CNitfFileReader missing;
-    EXPECT_EQ(missing.open("/nonexistent/file.ntf"), nullptr);
+    EXPECT_EQ(refusalOf([&] { reader.open(unknown.path().c_str()); }), "Unknown NITF file version");
+    EXPECT_EQ(reader.open("/nonexistent/file.ntf"), nullptr);
 
-    // An NSIF01.01 file is read with the 2.1 header as version 4; NITF 1.1 is recognised and shows nothing.
+    // An NSIF01.01 file is read with the 2.1 header; NITF 1.1 is recognised and shows nothing.
     std::string nsif = nitfsample::build(oneImageFile("NSIF01.00"));
     nsif.replace(0, 9, "NSIF01.01");
     OpenedSample sample(nsif);
-    EXPECT_EQ(sample.header()->getVersion(), eNsifVersion10);
     EXPECT_NE(dynamic_cast<CNitfFileHeaderV21*>(sample.header()), nullptr);
     EXPECT_EQ(sample.reader().getImageCount(), 1);
     OpenedSample old(std::string("NITF01.10") + std::string(500, ' '));
@@ -76,96 +57,50 @@ TEST(FileStructure, VersionsAreDetectedFromTheFirstNineBytes) {
     EXPECT_TRUE(old.header()->getFields().empty());
 }
 
-TEST(FileStructure, SegmentTablesChainFromTheHeaderLength) {
-    ByteStream table("002000499"
-                     "0000000100"
-                     "000512"
-                     "0000000200");
-    std::vector<CNitfHeaderDataPair*> pairs;
-    __int64 fieldBytes = 0;
-    int count = 0;
-    EXPECT_EQ(CNitfFileHeader::readPairs(table, 1000, 3, 6, 10, &pairs, fieldBytes, count), 1311);
-    EXPECT_EQ(count, 2);
-    EXPECT_EQ(fieldBytes, 35);
-    ASSERT_EQ(pairs.size(), 2u);
-    EXPECT_EQ(pairs[0]->getDataOffset(), 1499);
-    EXPECT_EQ(pairs[1]->getHeaderOffset(), 1599);
-    EXPECT_EQ(pairs[1]->getDataOffset(), 2111);
-
-    ByteStream empty("000");
-    std::vector<CNitfHeaderDataPair*> none;
-    EXPECT_EQ(CNitfFileHeader::readPairs(empty, 0, 3, 6, 10, &none, fieldBytes, count), 0);
-    EXPECT_EQ(fieldBytes, 3);
-    EXPECT_TRUE(none.empty());
-
+// (Segment tables are read against the manifest's offsets and lengths, and written back, on the corpus.)
+TEST(FileStructure, SegmentLengthsThatDoNotFitAreWrittenAsNines) {
     ByteStream out("");
     CNitfHeaderDataPair huge(0, 499, 12000000000LL);
     std::vector<CNitfHeaderDataPair*> one{&huge};
     CNitfFileHeader::writePairs(out, 3, 6, 10, &one);
-    DKFSeek64(out, 0, SEEK_SET);
-    char written[20] = {0};
-    DKFRead(written, 1, 19, out);
-    EXPECT_STREQ(written, "0010004999999999999");
-    for (CNitfHeaderDataPair* pair : pairs)
-        delete pair;
+    EXPECT_EQ(out.contents(), "0010004999999999999");
 }
 
+// (The fields, TREs and segments of real files are checked against the corpus manifest.)
 TEST(FileStructure, HeaderFieldsTresAndSegmentsOfA21File) {
     File file = oneImageFile();
     file.ftitle = "A TITLE";
-    file.fbkgc = "\xFF\x80";
-    file.fbkgc += '\0';
+    file.fbkgc = std::string("\xFF\x80\0", 3);
     file.udhd = {{"AAAAAA", "123"}, {"BBBBBB", ""}};
     file.xhd = {{"AAAAAA", "45"}};
-    file.graphics.emplace_back();
-    file.graphics.back().sid = "GRAPHIC1";
-    file.graphics.back().tres = {{"SYTRE1", "xy"}};
     file.texts.emplace_back();
-    file.texts.back().textid = "TXT1";
     file.texts.back().data = "Hello\r\nWorld";
     OpenedSample sample(file);
-    CNitfFileHeader* header = sample.header();
-
-    EXPECT_EQ(field(header->getProperties(), "FTITLE").substr(0, 8), "A TITLE ");
     char title[81];
-    header->getTitle(title);
+    sample.header()->getTitle(title);
     EXPECT_STREQ(title, "A TITLE");
-    EXPECT_EQ(field(header->getProperties(), "FBKGC"), "FF8000") << "the colour bytes read as hex text";
-    EXPECT_FALSE(header->getPropertiesModified());
+    EXPECT_EQ(fieldText(sample.header()->getProperties(), "FBKGC"), "FF8000")
+        << "the colour bytes read as hex text";
 
     // User-defined area first, then extended; numbering spans both areas.
-    std::list<CNitfTag*>& tags = header->getTaggedRecords();
+    std::list<CNitfTag*>& tags = sample.header()->getTaggedRecords();
     ASSERT_EQ(tags.size(), 3u);
-    auto it = tags.begin();
-    EXPECT_STREQ((*it)->getIdentifier(), "AAAAAA");
-    EXPECT_EQ((*it)->getOccurrence(), 1);
-    EXPECT_EQ((*it)->getSource(), CNitfTag::eTagSourceFileHeader);
-    ++it;
-    EXPECT_STREQ((*it)->getIdentifier(), "BBBBBB");
-    EXPECT_EQ((*it)->getDataLength(), 0);
-    ++it;
-    EXPECT_EQ((*it)->getOccurrence(), 2);
-    EXPECT_EQ((*it)->getTotal(), 2);
-
-    std::unique_ptr<CNitfSymbolSource> graphic(sample.reader().getNewSymbolSource(0));
-    EXPECT_EQ(graphic->getField("SID"), "GRAPHIC1");
-    ASSERT_EQ(graphic->getTaggedRecords().size(), 1u);
-    EXPECT_EQ(graphic->getTaggedRecords().front()->getSource(), CNitfTag::eTagSourceSymbol);
+    EXPECT_STREQ(tags.front()->getIdentifier(), "AAAAAA");
+    EXPECT_EQ(tags.front()->getSource(), CNitfTag::eTagSourceFileHeader);
+    EXPECT_EQ(tags.back()->getOccurrence(), 2);
+    EXPECT_EQ(tags.back()->getTotal(), 2);
 
     std::unique_ptr<CNitfTextSource> text(sample.reader().getNewTextSource(0));
-    EXPECT_EQ(text->getField("TEXTID"), "TXT1");
     std::string buffer(text->getDataLength() + 2, 'x');
     text->readText(&sample.reader(), &buffer[0]);
     EXPECT_EQ(buffer, std::string("Hello\r\nWorld\n\0", 14));
 
     // Out-of-range indexes raise instead of crashing.
-    EXPECT_EQ(messageOf([&] { sample.reader().getNewSymbolSource(1); }), "Invalid symbol index");
-    EXPECT_EQ(messageOf([&] { sample.reader().getNewTextSource(-1); }), "Invalid text index");
-    EXPECT_EQ(messageOf([&] { sample.reader().getNewLabelSource(0); }), "Invalid label index");
-    EXPECT_EQ(messageOf([&] { sample.reader().getNewDataExtensionSource(0); }),
-              "Invalid data extension index");
-    EXPECT_EQ(messageOf([&] { sample.reader().getNewImageSource(1); }), "Invalid image index");
-    EXPECT_FALSE(sample.reader().hasExtensionRpf());
+    EXPECT_THROW(sample.reader().getNewSymbolSource(0), vexo::Exception);
+    EXPECT_THROW(sample.reader().getNewTextSource(-1), vexo::Exception);
+    EXPECT_THROW(sample.reader().getNewLabelSource(0), vexo::Exception);
+    EXPECT_THROW(sample.reader().getNewDataExtensionSource(0), vexo::Exception);
+    EXPECT_THROW(sample.reader().getNewImageSource(1), vexo::Exception);
 }
 
 TEST(FileStructure, NonZeroReservedCountStopsTheHeader) {
@@ -186,66 +121,30 @@ TEST(FileStructure, OsdeAndNitf20Layouts) {
     osde.oid = "ORIGINATOR";
     OpenedSample sample(osde);
     PropertyMap& map = sample.header()->getProperties();
-    EXPECT_EQ(field(map, "OID").substr(0, 10), "ORIGINATOR");
-    EXPECT_EQ(field(map, "FBKGC"), "<absent>");
+    EXPECT_EQ(fieldText(map, "OID").substr(0, 10), "ORIGINATOR");
+    EXPECT_EQ(fieldText(map, "FBKGC"), "<absent>");
     std::unique_ptr<CNitfImageSubheader> image(
         sample.header()->getNewImageSubheader(sample.reader().getInputStream(), 0));
-    EXPECT_NE(field(image->getProperties(), "IINFO"), "<absent>");
-    EXPECT_NE(field(image->getProperties(), "ISCSEC"), "<absent>");
-    EXPECT_EQ(field(image->getProperties(), "ISCLAS"), "<absent>");
-    EXPECT_EQ(field(image->getProperties(), "TGTID"), "<absent>");
+    EXPECT_NE(fieldText(image->getProperties(), "IINFO"), "<absent>");
+    EXPECT_NE(fieldText(image->getProperties(), "ISCSEC"), "<absent>");
+    EXPECT_EQ(fieldText(image->getProperties(), "ISCLAS"), "<absent>");
+    EXPECT_EQ(fieldText(image->getProperties(), "TGTID"), "<absent>");
 
     File old = oneImageFile("NITF02.00");
     old.security.dwng = "999998";
     old.security.devt = "ON EVENT";
-    old.labels.emplace_back();
-    old.labels.back().lid = "LABEL1";
-    old.labels.back().data = "Label text";
     old.des.push_back(nitfsample::treOverflow("UDID", 1, {{"IMTRE1", "abc"}}, "NITF02.00"));
     old.des.back().security.ctlh = "HANDLING";
     OpenedSample sample20(old);
-    EXPECT_EQ(field(sample20.header()->getProperties(), "FSDEVT").substr(0, 8), "ON EVENT");
-    std::unique_ptr<CNitfLabelSource> label(sample20.reader().getNewLabelSource(0));
-    EXPECT_EQ(label->getField("LID"), "LABEL1");
+    EXPECT_EQ(fieldText(sample20.header()->getProperties(), "FSDEVT").substr(0, 8), "ON EVENT");
     std::unique_ptr<CNitfDataExtensionSource> des(sample20.reader().getNewDataExtensionSource(0));
     EXPECT_TRUE(des->isOverflow());
     EXPECT_EQ(des->getField("DECTLH"), "HANDLING") << "2.0 keeps its own key for control and handling";
     EXPECT_EQ(des->getField("DESCTLH"), "");
 }
 
-TEST(FileStructure, WrittenHeadersMatchTheirStorageLength) {
-    for (const char* version : {"NITF02.10", "OSDE01.00", "NITF02.00"}) {
-        OpenedSample sample(oneImageFile(version));
-        CNitfFileHeader* header = sample.header();
-        ByteStream out("");
-        header->write(out);
-        EXPECT_EQ(DKFTell(out), header->computeStorageLength()) << version;
-        if (std::string(version) != "NITF02.00") {
-            // The tail is fixed: no graphics, texts, DES or TREs.
-            std::string bytes(static_cast<size_t>(DKFTell(out)), '\0');
-            DKFSeek64(out, 0, SEEK_SET);
-            DKFRead(&bytes[0], 1, bytes.size(), out);
-            EXPECT_EQ(bytes.substr(bytes.size() - 25), std::string(15, '0') + std::string(10, '0'));
-        }
-    }
-    OpenedSample nitf(oneImageFile("NITF02.10"));
-    OpenedSample osde(oneImageFile("OSDE01.00"));
-    EXPECT_EQ(nitf.header()->computeStorageLength(), osde.header()->computeStorageLength());
-
-    CNitfFileHeaderV21 fresh;
-    for (const char* name : {"FHDR", "CLEVEL", "STYPE", "OSTAID", "FDT", "FTITLE", "ONAME", "OPHONE"})
-        SetProperty(fresh.getProperties(), name, new CNitfProperty(""));
-    SetProperty(fresh.getProperties(), "FBKGC", new CNitfProperty("FF8000"));
-    ByteStream out("");
-    fresh.write(out);
-    DKFSeek64(out, 9 + 2 + 4 + 10 + 14 + 80 + 167 + 5 + 5 + 1, SEEK_SET);
-    unsigned char colour[3];
-    DKFRead(colour, 1, 3, out);
-    EXPECT_EQ(colour[0], 0xFF);
-    EXPECT_EQ(colour[1], 0x80);
-    EXPECT_EQ(colour[2], 0x00);
-}
-
+// (Background colours, like every field of the corpus's headers, are written back byte for byte in the
+// record round trips.)
 TEST(FileStructure, OverflowSegmentsAttachTheirTres) {
     File file = oneImageFile();
     file.des.push_back(nitfsample::treOverflow("UDID", 1, {{"IMTRE1", "abc"}, {"IMTRE2", ""}}));
@@ -273,32 +172,21 @@ TEST(FileStructure, OverflowSegmentsAttachTheirTres) {
 
 TEST(FileStructure, DataExtensionKinds) {
     File file = oneImageFile();
-    Des xml;
+    Des xml, shape, plain;
     xml.desid = "XML_DATA_CONTENT";
     xml.desshf = "abcde";
-    xml.data = "<x/>";
-    Des shape;
     shape.desid = "CSSHPA DES";
-    shape.fields["SHAPE_USE"] = "IMAGE_SHAPE";
-    Des plain;
     plain.desid = "TEST_DES";
     file.des = {xml, shape, plain};
     OpenedSample sample(file);
-
     std::unique_ptr<CNitfDataExtensionSource> first(sample.reader().getNewDataExtensionSource(0));
     EXPECT_TRUE(first->isXMLDES());
     EXPECT_EQ(first->getField("DESSHF"), "abcde");
-    std::unique_ptr<CNitfDataExtensionSource> cloud(sample.reader().getNewDataExtensionSource(1));
-    EXPECT_TRUE(cloud->isCloudShape());
-    EXPECT_FALSE(cloud->isCSSHPAImageShapeDES()) << "fields read from a file keep their blanks";
-    SetProperty(cloud->getProperties(), "DESID", new CNitfProperty("csshpa des"));
-    SetProperty(cloud->getProperties(), "SHAPE_USE", new CNitfProperty("IMAGE_SHAPE"));
-    EXPECT_TRUE(cloud->isCSSHPAImageShapeDES());
+    EXPECT_TRUE(std::unique_ptr<CNitfDataExtensionSource>(sample.reader().getNewDataExtensionSource(1))
+                    ->isCloudShape());
     std::unique_ptr<CNitfDataExtensionSource> third(sample.reader().getNewDataExtensionSource(2));
     EXPECT_FALSE(third->isXMLDES());
-    EXPECT_FALSE(third->isCSSHPAImageShapeDES());
-    EXPECT_EQ(third->getField("DESSHF"), "") << "DESSHL 0000 has no DESSHF";
-    EXPECT_EQ(FindProperty(third->getProperties(), "DESSHF"), nullptr);
+    EXPECT_EQ(FindProperty(third->getProperties(), "DESSHF"), nullptr) << "DESSHL 0000 has no DESSHF";
 }
 
 TEST(FileStructure, StreamingHeaderReplacesTheHeader) {
@@ -308,7 +196,7 @@ TEST(FileStructure, StreamingHeaderReplacesTheHeader) {
     auto* header = dynamic_cast<CNitfFileHeaderV21*>(sample.header());
     ASSERT_NE(header, nullptr);
     EXPECT_TRUE(header->isStreamingReplacement());
-    EXPECT_NE(field(header->getProperties(), "FL"), "999999999999");
+    EXPECT_NE(fieldText(header->getProperties(), "FL"), "999999999999");
     EXPECT_LT(header->getImageHeaderDataPair(0)->getDataLength(), 9999999999LL);
 
     std::unique_ptr<CNitfDataExtensionSource> des(
@@ -323,6 +211,6 @@ TEST(FileStructure, StreamingHeaderReplacesTheHeader) {
     File partial = oneImageFile();
     partial.fields["FL"] = "999999999999";
     partial.des.push_back(nitfsample::streamingFileHeader(std::string(100, ' ')));
-    EXPECT_EQ(messageOf([&] { OpenedSample broken(partial); }),
+    EXPECT_EQ(refusalOf([&] { OpenedSample broken(partial); }),
               "Only a file header replacement is supported for a streaming file header.");
 }

@@ -9,7 +9,6 @@
 #include <cstring>
 #include <fstream>
 #include <functional>
-#include <map>
 #include <memory>
 #include <optional>
 #include <sstream>
@@ -25,63 +24,37 @@ using namespace nitfpicture;
 
 namespace {
 
-const SampleType kEveryType[] = {SampleType::UInt8,   SampleType::Int8,           SampleType::UInt16,
-                                 SampleType::Int16,   SampleType::UInt32,         SampleType::Int32,
-                                 SampleType::UInt64,  SampleType::Int64,          SampleType::Float32,
-                                 SampleType::Float64, SampleType::ComplexFloat32, SampleType::ComplexFloat64};
-
+// GDAL's names of the types, in the order of SampleType.
 const char* gdalTypeName(SampleType type) {
-    static const std::map<SampleType, const char*> names = {{SampleType::UInt8, "Byte"},
-                                                            {SampleType::Int8, "Byte"},
-                                                            {SampleType::UInt16, "UInt16"},
-                                                            {SampleType::Int16, "Int16"},
-                                                            {SampleType::UInt32, "UInt32"},
-                                                            {SampleType::Int32, "Int32"},
-                                                            {SampleType::UInt64, "UInt64"},
-                                                            {SampleType::Int64, "Int64"},
-                                                            {SampleType::Float32, "Float32"},
-                                                            {SampleType::Float64, "Float64"},
-                                                            {SampleType::ComplexFloat32, "CFloat32"},
-                                                            {SampleType::ComplexFloat64, "CFloat64"}};
-    return names.at(type);
+    static const char* const names[] = {"Byte",   "Byte",  "UInt16",  "Int16",   "UInt32",   "Int32",
+                                        "UInt64", "Int64", "Float32", "Float64", "CFloat32", "CFloat64"};
+    return names[static_cast<int>(type)];
 }
 
-// Full-range bits for (band, row, col).
-uint64_t pattern(int band, int row, int col) {
-    return (static_cast<uint64_t>(band) * 1000003 + static_cast<uint64_t>(row) * 7919 +
-            static_cast<uint64_t>(col) * 104729 + 1) *
-           0x9E3779B97F4A7C15ULL;
+template <typename T> void put(unsigned char* out, T value) {
+    std::memcpy(out, &value, sizeof value);
 }
 
-// One sample of `type`, native, from the pattern: integers take its low bytes, reals a scaled value, complex
-// numbers two of them.
+// One sample of `type`, native, from full-range bits for (band, row, col): integers take their low bytes,
+// reals a scaled value, complex numbers two of them.
 void sampleAt(SampleType type, int band, int row, int col, unsigned char* out) {
-    const uint64_t bits = pattern(band, row, col);
-    auto real = [](uint64_t b) { return static_cast<double>(static_cast<int32_t>(b >> 16)) / 1024.0; };
+    const uint64_t bits = (static_cast<uint64_t>(band) * 1000003 + static_cast<uint64_t>(row) * 7919 +
+                           static_cast<uint64_t>(col) * 104729 + 1) *
+                          0x9E3779B97F4A7C15ULL;
+    const double a = static_cast<int32_t>(bits >> 16) / 1024.0, b = static_cast<int32_t>(bits >> 36) / 1024.0;
     switch (type) {
-    case SampleType::Float32: {
-        const float v = static_cast<float>(real(bits));
-        std::memcpy(out, &v, 4);
-        return;
-    }
-    case SampleType::Float64: {
-        const double v = real(bits) / 3;
-        std::memcpy(out, &v, 8);
-        return;
-    }
-    case SampleType::ComplexFloat32: {
-        const float v[2] = {static_cast<float>(real(bits)), static_cast<float>(real(bits >> 20))};
-        std::memcpy(out, v, 8);
-        return;
-    }
-    case SampleType::ComplexFloat64: {
-        const double v[2] = {real(bits) / 3, real(bits >> 20) / 7};
-        std::memcpy(out, v, 16);
-        return;
-    }
+    case SampleType::Float32:
+        return put(out, static_cast<float>(a));
+    case SampleType::Float64:
+        return put(out, a / 3);
+    case SampleType::ComplexFloat32:
+        put(out, static_cast<float>(a));
+        return put(out + 4, static_cast<float>(b));
+    case SampleType::ComplexFloat64:
+        put(out, a / 3);
+        return put(out + 8, b / 7);
     default:
         std::memcpy(out, &bits, sampleBytes(type)); // little-endian: the low bytes
-        return;
     }
 }
 
@@ -186,6 +159,13 @@ std::string sha(const Plane& plane) {
     return Sha256::of(std::string(plane.begin(), plane.end()));
 }
 
+TiffOptions cogOf(int tileSize) {
+    TiffOptions options;
+    options.cog = true;
+    options.tileSize = tileSize;
+    return options;
+}
+
 GeoReference geographic() {
     GeoReference geo;
     geo.system = GeoReference::System::Geographic;
@@ -194,12 +174,6 @@ GeoReference geographic() {
     std::copy(gt, gt + 6, geo.geotransform);
     return geo;
 }
-
-// Skips the test when GDAL's Python bindings are not installed.
-#define GDAL_VIEW(view, paths)                                                                               \
-    std::optional<nlohmann::json> view = gdalView(paths);                                                    \
-    if (!view)                                                                                               \
-    GTEST_SKIP() << "GDAL's Python bindings (python3-gdal) are not installed"
 
 } // namespace
 
@@ -212,7 +186,8 @@ TEST(GeoTiffWriter, EverySampleTypeInBothLayoutsReadsBackThroughGdal) {
         std::vector<std::string> shas;
     };
     std::vector<Written> written;
-    for (SampleType type : kEveryType) {
+    for (int t = 0; t <= static_cast<int>(SampleType::ComplexFloat64); ++t) {
+        const SampleType type = static_cast<SampleType>(t);
         for (bool bandSequential : {false, true}) {
             for (bool compressed : {false, true}) {
                 // Odd sizes over 16-pixel tiles: partial tiles at the right and bottom.
@@ -268,36 +243,22 @@ TEST(GeoTiffWriter, CloudOptimizedLayoutWithAveragedOverviews) {
         {"RGB, deflate", {1100, 700, 3, SampleType::UInt8, false}, Compression::Default, false},
         {"two 16-bit planes, zstd", {1100, 700, 2, SampleType::UInt16, true}, Compression::Zstd, false},
         {"float with no-data", {1100, 700, 1, SampleType::Float32, false}, Compression::Deflate, true},
-        {"signed 16-bit with no-data", {1100, 700, 1, SampleType::Int16, true}, Compression::Deflate, true},
-    };
+        {"signed 16-bit with no-data", {1100, 700, 1, SampleType::Int16, true}, Compression::Deflate, true}};
     const double noData = -7;
     // Smooth content (a ramp with every 11th sample no-data), so that averages mean something.
     auto contentOf = [noData](SampleType type, bool holes) -> Content {
         return [=](int, int band, int row, int col, unsigned char* out) {
-            double value = (row * 3 + col * 5 + band * 101) % 4000 / (type == SampleType::UInt8 ? 16.0 : 1.0);
-            if (holes && (row * 1100 + col) % 11 == 0)
-                value = noData;
+            const double value = (row * 3 + col * 5 + band * 101) % 4000;
+            const bool hole = holes && (row * 1100 + col) % 11 == 0;
             switch (type) {
-            case SampleType::UInt8: {
-                const uint8_t v = static_cast<uint8_t>(value);
-                std::memcpy(out, &v, 1);
-                break;
-            }
-            case SampleType::UInt16: {
-                const uint16_t v = static_cast<uint16_t>(value);
-                std::memcpy(out, &v, 2);
-                break;
-            }
-            case SampleType::Int16: {
-                const int16_t v = static_cast<int16_t>(holes && value == noData ? value : value - 2000);
-                std::memcpy(out, &v, 2);
-                break;
-            }
-            default: {
-                const float v = static_cast<float>(value == noData ? value : value / 8);
-                std::memcpy(out, &v, 4);
-                break;
-            }
+            case SampleType::UInt8:
+                return put(out, static_cast<uint8_t>(value / 16));
+            case SampleType::UInt16:
+                return put(out, static_cast<uint16_t>(value));
+            case SampleType::Int16:
+                return put(out, static_cast<int16_t>(hole ? noData : value - 2000));
+            default:
+                return put(out, static_cast<float>(hole ? noData : value / 8));
             }
         };
     };
@@ -306,9 +267,7 @@ TEST(GeoTiffWriter, CloudOptimizedLayoutWithAveragedOverviews) {
     std::vector<std::vector<std::vector<std::string>>> expected; // case, band, level
     for (const Case& c : cases) {
         SyntheticRaster raster(c.format, contentOf(c.format.type, c.noData), 0, 256);
-        TiffOptions options;
-        options.cog = true;
-        options.tileSize = 256;
+        TiffOptions options = cogOf(256);
         options.compression = c.compression;
         options.hasNoData = c.noData;
         options.noData = noData;
@@ -317,19 +276,17 @@ TEST(GeoTiffWriter, CloudOptimizedLayoutWithAveragedOverviews) {
         files.push_back(std::make_unique<TempFile>("", ".tif"));
         ASSERT_NO_THROW(writeGeoTiff(files.back()->path(), raster, geographic(), options)) << c.name;
         paths.push_back(files.back()->path());
-        ASSERT_FALSE(progress.empty());
         EXPECT_TRUE(std::is_sorted(progress.begin(), progress.end())) << c.name;
         EXPECT_EQ(progress.back(), 1.0);
 
-        const int bytes = sampleBytes(c.format.type);
-        std::vector<std::vector<std::string>> bands;
+        expected.emplace_back();
         for (int b = 0; b < c.format.bands; ++b) {
-            std::vector<std::string> levels;
-            Plane plane = planeOf(contentOf(c.format.type, c.noData), 0, b, 1100, 700, bytes);
-            int width = 1100, height = 700;
-            levels.push_back(sha(plane));
-            for (int level = 1; level <= 3; ++level) {
-                const double* hole = c.noData ? &noData : nullptr;
+            Plane plane =
+                planeOf(contentOf(c.format.type, c.noData), 0, b, 1100, 700, sampleBytes(c.format.type));
+            expected.back().push_back({sha(plane)});
+            const double* hole = c.noData ? &noData : nullptr;
+            for (int width = 1100, height = 700; width > 138;
+                 width = (width + 1) / 2, height = (height + 1) / 2) {
                 switch (c.format.type) {
                 case SampleType::UInt8:
                     plane = halvedReference<uint8_t>(plane, width, height, hole);
@@ -342,17 +299,13 @@ TEST(GeoTiffWriter, CloudOptimizedLayoutWithAveragedOverviews) {
                     break;
                 default:
                     plane = halvedReference<float>(plane, width, height, hole);
-                    break;
                 }
-                width = (width + 1) / 2;
-                height = (height + 1) / 2;
-                levels.push_back(sha(plane));
+                expected.back().back().push_back(sha(plane));
             }
-            bands.push_back(levels);
         }
-        expected.push_back(bands);
     }
     GDAL_VIEW(view, paths);
+    const int sizes[3][2] = {{550, 350}, {275, 175}, {138, 88}};
     for (size_t i = 0; i < expected.size(); ++i) {
         SCOPED_TRACE(cases[i].name);
         const nlohmann::json& file = (*view)[i];
@@ -361,35 +314,15 @@ TEST(GeoTiffWriter, CloudOptimizedLayoutWithAveragedOverviews) {
             const nlohmann::json& band = file["bands"][b];
             EXPECT_EQ(band["sha256"], expected[i][b][0]);
             ASSERT_EQ(band["overviews"].size(), 3u);
-            const int sizes[3][2] = {{550, 350}, {275, 175}, {138, 88}};
-            for (int level = 1; level <= 3; ++level) {
-                EXPECT_EQ(band["overviews"][level - 1][0], sizes[level - 1][0]);
-                EXPECT_EQ(band["overviews"][level - 1][1], sizes[level - 1][1]);
-                EXPECT_EQ(band["overviews"][level - 1][2], expected[i][b][level])
+            for (int level = 1; level <= 3; ++level)
+                EXPECT_EQ(
+                    band["overviews"][level - 1],
+                    nlohmann::json::array({sizes[level - 1][0], sizes[level - 1][1], expected[i][b][level]}))
                     << "band " << b << " level " << level;
-            }
             if (cases[i].noData) {
                 EXPECT_EQ(band["nodata"], noData);
             }
         }
-    }
-}
-
-TEST(GeoTiffWriter, ThreadsWriteTheSameFile) {
-    RasterFormat format{700, 600, 3, SampleType::UInt16, true};
-    std::string first;
-    for (int threads : {1, 3}) {
-        SyntheticRaster raster(format, patternContent(SampleType::UInt16));
-        TiffOptions options;
-        options.cog = true;
-        options.tileSize = 128;
-        options.threads = threads;
-        TempFile file("", ".tif");
-        ASSERT_NO_THROW(writeGeoTiff(file.path(), raster, geographic(), options));
-        if (first.empty())
-            first = file.read();
-        else
-            EXPECT_TRUE(file.read() == first) << "the tiles land in the same order";
     }
 }
 
@@ -401,11 +334,8 @@ TEST(GeoTiffWriter, ReducedResolutionsComeFromTheSource) {
         *out = static_cast<unsigned char>(level == 0 ? (row + col) % 256 : 40 * level + (row % 2) * 10);
     };
     SyntheticRaster raster(format, content, 2, 128);
-    TiffOptions options;
-    options.cog = true;
-    options.tileSize = 128;
     TempFile file("", ".tif");
-    ASSERT_NO_THROW(writeGeoTiff(file.path(), raster, GeoReference(), options));
+    ASSERT_NO_THROW(writeGeoTiff(file.path(), raster, GeoReference(), cogOf(128)));
     EXPECT_EQ(raster.rowsRead(0), 1000);
     EXPECT_EQ(raster.rowsRead(1), 500);
     EXPECT_EQ(raster.rowsRead(2), 250);
@@ -435,9 +365,7 @@ TEST(GeoTiffWriter, TiePointsRpcColourMapAndNoData) {
     RasterFormat format{600, 400, 1, SampleType::UInt8, false};
     Content content = [](int, int, int row, int col, unsigned char* out) { *out = (row / 3 + col / 5) % 4; };
     SyntheticRaster raster(format, content);
-    TiffOptions options;
-    options.cog = true;
-    options.tileSize = 256;
+    TiffOptions options = cogOf(256);
     options.palette = {255, 0, 0, 0, 255, 0, 0, 0, 255, 250, 250, 250};
     options.hasNoData = true;
     options.noData = 3;
@@ -450,10 +378,8 @@ TEST(GeoTiffWriter, TiePointsRpcColourMapAndNoData) {
     EXPECT_EQ(tif["gcp_epsg"], 32617);
     EXPECT_TRUE(tif["geotransform"].is_null());
     for (size_t i = 0; i < 4; ++i) {
-        EXPECT_EQ(tif["gcps"][i][0], geo.tiePoints[i].col);
-        EXPECT_EQ(tif["gcps"][i][1], geo.tiePoints[i].row);
-        EXPECT_EQ(tif["gcps"][i][2], geo.tiePoints[i].x);
-        EXPECT_EQ(tif["gcps"][i][3], geo.tiePoints[i].y);
+        const GeoReference::TiePoint& p = geo.tiePoints[i];
+        EXPECT_EQ(tif["gcps"][i], nlohmann::json::array({p.col, p.row, p.x, p.y}));
     }
     // Offsets and scales first, then the coefficients.
     EXPECT_EQ(std::stod(tif["rpc"]["LINE_OFF"].get<std::string>()), 102);
@@ -482,9 +408,8 @@ TEST(GeoTiffWriter, FailuresThrowAndLeaveNoFile) {
     for (bool cog : {false, true}) {
         SyntheticRaster raster(format, patternContent(SampleType::UInt8), 0, 256);
         raster.failAtRow(200);
-        TiffOptions options;
+        TiffOptions options = cogOf(128);
         options.cog = cog;
-        options.tileSize = 128;
         EXPECT_THROW(writeGeoTiff(path, raster, GeoReference(), options), std::runtime_error);
         EXPECT_EQ(readWholeFile(path), "") << "the output is removed";
         EXPECT_FALSE(std::ifstream(path).good());

@@ -28,27 +28,6 @@ using Form = CNitfGeorefInfo::eCoordinateType_t;
 
 namespace {
 
-// Warnings raised while it lives, instead of on stderr.
-class CapturedWarnings {
-public:
-    CapturedWarnings() {
-        m_previous = vexo::nspio::Warning::setHandler(
-            [this](const char* message, const char*, int) { m_messages.push_back(message); });
-    }
-    ~CapturedWarnings() { vexo::nspio::Warning::setHandler(m_previous); }
-    const std::vector<std::string>& messages() const { return m_messages; }
-    bool contains(const std::string& text) const {
-        for (const std::string& message : m_messages)
-            if (message.find(text) != std::string::npos)
-                return true;
-        return false;
-    }
-
-private:
-    std::vector<std::string> m_messages;
-    vexo::nspio::Warning::Handler m_previous;
-};
-
 // Latitude and longitude of a parsed corner.
 void geocoded(const CornerPoint& point, double* latitude, double* longitude) {
     ProjInfo_t record;
@@ -81,8 +60,7 @@ const WorkedExample kWorkedExamples[] = {
     {CNitfGeorefInfo::eCoordinatesUtmSouth, "327933278155361", -16.666110, 11.750000},
     {CNitfGeorefInfo::eCoordinatesMgrs, "17SKU3308507070", 34.370624, -83.902537},
     {CNitfGeorefInfo::eCoordinatesMgrs, "32KQG9332755361", -16.666110, 11.750000},
-    {CNitfGeorefInfo::eCoordinatesGeocentric, "325900N0850000E", 33.159316, 85.000000},
-};
+    {CNitfGeorefInfo::eCoordinatesGeocentric, "325900N0850000E", 33.159316, 85.000000}};
 
 } // namespace
 
@@ -123,8 +101,7 @@ TEST(GeorefCornerText, MalformedCornersAreRefused) {
         {CNitfGeorefInfo::eCoordinatesMgrs, "17SKI3308507070"}, // nor does row letter I
         {CNitfGeorefInfo::eCoordinatesMgrs, "ZAH330850707070"}, // polar: not this form
         {CNitfGeorefInfo::eCoordinatesUps, "P12345671234567"},
-        {CNitfGeorefInfo::eCoordinatesOther, "440344N1230429W"},
-    };
+        {CNitfGeorefInfo::eCoordinatesOther, "440344N1230429W"}};
     for (const auto& [form, text] : bad) {
         CornerPoint point;
         EXPECT_FALSE(nitf_georef::parseIgeoloCorner(form, text, &point)) << text;
@@ -174,29 +151,15 @@ TEST(GeorefCornerText, WritingRoundsAndRefusesAsTheFormsSay) {
     EXPECT_FALSE(nitf_georef::formatIgeoloCorner(CNitfGeorefInfo::eCoordinatesGeographic, utm, text));
 }
 
-TEST(GeorefCornerText, BlockaLocationsAndGeolobGrid) {
-    double latDecimal, lonDecimal, latDms, lonDms;
-    ASSERT_TRUE(nitf_georef::parseBlockaLocation("+39.241191-118.292969", &latDecimal, &lonDecimal));
-    EXPECT_DOUBLE_EQ(latDecimal, 39.241191);
-    EXPECT_DOUBLE_EQ(lonDecimal, -118.292969);
-    // The same corner in the other form: 39°14'28.29"N 118°17'34.69"W, equal to 0.01".
-    ASSERT_TRUE(nitf_georef::parseBlockaLocation("N391428.29W1181734.69", &latDms, &lonDms));
-    EXPECT_NEAR(latDms, latDecimal, 0.01 / 3600);
-    EXPECT_NEAR(lonDms, lonDecimal, 0.01 / 3600);
-    for (const char* bad : {"                     ", "+39.241191 118.292969", "N396028.29W1181734.69"}) {
-        EXPECT_FALSE(nitf_georef::parseBlockaLocation(bad, &latDms, &lonDms)) << bad;
-    }
-
+// (Well-formed BLOCKA and GEOLOB data are read into precise corners below and on the corpus.)
+TEST(GeorefCornerText, MalformedBlockaAndGeolobAreRefused) {
+    double latitude, longitude;
+    for (const char* bad : {"                     ", "+39.241191 118.292969", "N396028.29W1181734.69"})
+        EXPECT_FALSE(nitf_georef::parseBlockaLocation(bad, &latitude, &longitude)) << bad;
     nitf_georef::GeolobGrid grid;
-    ASSERT_TRUE(nitf_georef::parseGeolob("022060370030590149-123.0749837910+044.0622542218", &grid));
-    EXPECT_EQ(grid.arv, 22060370);
-    EXPECT_EQ(grid.brv, 30590149);
-    EXPECT_DOUBLE_EQ(grid.lso, -123.0749837910);
-    EXPECT_DOUBLE_EQ(grid.pso, 44.0622542218);
     for (const char* bad : {"000000000030590149-123.0749837910+044.0622542218",
-                            "022060370030590149-123.07498379X0+044.0622542218"}) {
+                            "022060370030590149-123.07498379X0+044.0622542218"})
         EXPECT_FALSE(nitf_georef::parseGeolob(bad, &grid)) << bad;
-    }
 }
 
 // ---- reading and writing through the image source ---------------------------------------------------------
@@ -236,13 +199,13 @@ struct ReadResult {
 
 ReadResult readRecord(const nitfsample::File& file, bool precise) {
     OpenedSample sample(file);
-    std::unique_ptr<CNitfImageSource> image(sample.reader().getNewImageSource(0));
+    CNitfImageSource& image = sample.source();
     ReadResult result;
     FILE* fp = sample.reader().getInputStream();
     DKFSeek64(fp, 7, SEEK_SET);
-    image->readProjection(fp, &result.record, precise);
+    image.readProjection(fp, &result.record, precise);
     EXPECT_EQ(DKFTell(fp), 7) << "the stream's position is kept";
-    result.source = image->getImageSubheader()->getGeorefSource().getCornerSource();
+    result.source = image.getImageSubheader()->getGeorefSource().getCornerSource();
     return result;
 }
 
@@ -276,23 +239,12 @@ const std::string kRectangleG = "200000N0200000W200000N0200000E200000S0200000E20
 } // namespace
 
 TEST(GeorefInfo, EveryFormFillsTheRecord) {
-    // Geographic: a rectangle, so the record has the affine transform too.
-    ReadResult g = readRecord(georeferencedFile('G', kRectangleG, 101, 201), false);
-    EXPECT_EQ(g.source, CNitfGeorefInfo::eCornerSourceIgeolo);
-    EXPECT_EQ(g.record.system, PROJ_GEOGRAPHIC);
-    EXPECT_EQ(g.record.hasAffine, 1);
-    EXPECT_EQ(g.record.width, 201);
-    EXPECT_DOUBLE_EQ(g.record.cornerX[2], 20);
-    EXPECT_DOUBLE_EQ(g.record.cornerY[2], -20);
-    EXPECT_NEAR(g.record.affine[1], 0.2, 1e-12); // 40 degrees over 200 columns
-    EXPECT_NEAR(g.record.affine[5], -0.4, 1e-12);
+    // (A geographic rectangle's transform is checked with the georeferencing report.)
 
     // UTM north keeps easting and northing exactly; the 2.1 worked example's whole IGEOLO.
     ReadResult n = readRecord(
         georeferencedFile('N', "172330853807070172349753807070172349753805180172330853805180"), false);
-    EXPECT_EQ(n.record.system, PROJ_UTM);
-    EXPECT_EQ(n.record.zone, 17);
-    EXPECT_EQ(n.record.southern, 0);
+    EXPECT_EQ(n.record.system * 100 + n.record.zone * 10 + n.record.southern, PROJ_UTM * 100 + 170);
     EXPECT_EQ(n.record.cornerX[1], 234975);
     EXPECT_EQ(n.record.cornerY[2], 3805180);
 
@@ -312,13 +264,8 @@ TEST(GeorefInfo, EveryFormFillsTheRecord) {
     EXPECT_EQ(none21.record.hasCorners, 0);
 }
 
-TEST(GeorefInfo, TiePointsWithoutAffineAndCornersAcrossZones) {
-    // Not a parallelogram: the corners stand alone.
-    ReadResult skew = readRecord(
-        georeferencedFile('D', "+10.000+020.000+10.000+021.000+09.000+021.500+09.000+020.000"), false);
-    EXPECT_EQ(skew.record.hasCorners, 1);
-    EXPECT_EQ(skew.record.hasAffine, 0);
-
+TEST(GeorefInfo, CornersAcrossZonesKeepTheFirstCornersZone) {
+    // (Corners that are not a parallelogram stand alone: see the georeferencing report.)
     // A corner in the next zone east is carried into the first corner's zone.
     double latitude = 34.37, longitude = -77.0, x, y;
     ProjInfo_t zone18;
@@ -344,11 +291,11 @@ TEST(GeorefInfo, DamagedOrUndecodedCornersAreWarnedNotGuessed) {
         georeferencedFile('G', "200000N0200000W200000N02000X0E200000S0200000E200000S0200000W"), true);
     EXPECT_EQ(bad.record.system, PROJ_NONE);
     EXPECT_EQ(bad.record.hasCorners, 0);
-    EXPECT_TRUE(warnings.contains("IGEOLO corner 2"))
+    EXPECT_TRUE(warnings.count("IGEOLO corner 2"))
         << (warnings.messages().empty() ? "" : warnings.messages()[0]);
     ReadResult ups = readRecord(georeferencedFile('P', std::string(60, '1')), false);
     EXPECT_EQ(ups.record.hasCorners, 0);
-    EXPECT_TRUE(warnings.contains("\"P\" are not decoded"));
+    EXPECT_TRUE(warnings.count("\"P\" are not decoded"));
     // A letter ICORDS does not define still has its 60 bytes, and no corners.
     ReadResult other = readRecord(georeferencedFile('X', kRectangleG), false);
     EXPECT_EQ(other.record.hasCorners, 0);
@@ -373,61 +320,34 @@ TEST(GeorefInfo, PreciseCornersReplaceIgeoloWhenTheyAgree) {
                                                      "N391345.91W1181630.73", "N391256.57W1181724.79")};
     EXPECT_EQ(readRecord(georeferencedFile('G', igeolo, 100, 100, {otherRows}), true).source,
               CNitfGeorefInfo::eCornerSourceIgeolo);
-    EXPECT_TRUE(warnings.contains("BLOCKA describes 8960 rows"));
+    EXPECT_TRUE(warnings.count("BLOCKA describes 8960 rows"));
     const nitfsample::Tre rotated{"BLOCKA", blocka(100, "N391428.29W1181734.69", "N391345.91W1181630.73",
                                                    "N391256.57W1181724.79", "N391338.95W1181828.74")};
     EXPECT_EQ(readRecord(georeferencedFile('G', igeolo, 100, 100, {rotated}), true).source,
               CNitfGeorefInfo::eCornerSourceIgeolo);
-    EXPECT_TRUE(warnings.contains("BLOCKA corner 1 disagrees with IGEOLO"));
+    EXPECT_TRUE(warnings.count("BLOCKA corner 1 disagrees with IGEOLO"));
     // Without IGEOLO there is nothing to disagree with.
     EXPECT_EQ(readRecord(georeferencedFile(0, "", 100, 100, {rotated}), true).source,
               CNitfGeorefInfo::eCornerSourceBlocka);
-
-    // GEOLOB beats BLOCKA: its grid is exact, and its corners are the corner pixels' centres.
+    // GEOLOB beats BLOCKA: its grid is exact (its corners, the corner pixels' centres, are checked on the
+    // corpus); RPF coverage corners, once given, come first.
     const nitfsample::Tre grid{"GEOLOB", "000360000000360000-118.3080000000+039.2280000000"};
     const std::string gridIgeolo = "391339N1181827W391339N1161831W381343N1161831W381343N1181827W";
     ReadResult geolob = readRecord(georeferencedFile('G', gridIgeolo, 1000, 2000, {block, grid}), true);
-    ASSERT_EQ(geolob.source, CNitfGeorefInfo::eCornerSourceGeolob);
-    EXPECT_EQ(geolob.record.hasAffine, 1);
-    EXPECT_NEAR(geolob.record.affine[0], -118.308 + 0.0005, 1e-12);
+    EXPECT_EQ(geolob.source, CNitfGeorefInfo::eCornerSourceGeolob);
     EXPECT_NEAR(geolob.record.affine[1], 0.001, 1e-15);
-    EXPECT_NEAR(geolob.record.affine[3], 39.228 - 0.0005, 1e-12);
-    EXPECT_NEAR(geolob.record.affine[5], -0.001, 1e-15);
-    EXPECT_NEAR(geolob.record.cornerX[2], -118.308 + 1999.5 * 0.001, 1e-12);
-
-    // RPF coverage corners, once given, come first.
     OpenedSample sample(georeferencedFile('G', kRectangleG, 100, 100, {grid}));
-    std::unique_ptr<CNitfImageSource> image(sample.reader().getNewImageSource(0));
+    CNitfGeorefInfo& georef = sample.source().getImageSubheader()->getGeorefSource();
     const double latitude[4] = {20.0001, 20.0001, -20.0001, -20.0001}, longitude[4] = {-20, 20, 20, -20};
-    image->getImageSubheader()->getGeorefSource().setCoverageCorners(latitude, longitude);
+    georef.setCoverageCorners(latitude, longitude);
     ProjInfo_t record;
-    image->readProjection(sample.reader().getInputStream(), &record, true);
-    EXPECT_EQ(image->getImageSubheader()->getGeorefSource().getCornerSource(),
-              CNitfGeorefInfo::eCornerSourceRpfCoverage);
-    EXPECT_EQ(record.cornerY[0], 20.0001);
+    sample.source().readProjection(sample.reader().getInputStream(), &record, true);
+    EXPECT_EQ(georef.getCornerSource(), CNitfGeorefInfo::eCornerSourceRpfCoverage);
 }
 
-TEST(GeorefInfo, WritingReproducesIgeoloInEveryForm) {
-    struct Case {
-        char icords;
-        std::string igeolo;
-        std::string version;
-    };
-    const Case cases[] = {
-        {'G', "440344N1230429W440344N1230346W440300N1230346W440300N1230429W", "NITF02.10"},
-        {'D', "+39.804-084.146+39.804-084.076+39.756-084.076+39.756-084.146", "NITF02.10"},
-        {'D', "-00.001-000.001+00.000+000.000-89.999+179.999+90.000-180.000", "NITF02.10"},
-        {'N', "172330853807070172349753807070172349753805180172330853805180", "NITF02.10"},
-        {'S', "327933278155361327943278155361327943278145361327933278145361", "NSIF01.00"},
-        {'U', "17SKU330850707017SKU349750707017SKU349750518017SKU3308505180", "NITF02.10"},
-        {'U', "32KQG933275536132KQG943275536132KQG943275436132KQG9332754361", "NITF02.00"},
-        {'C', "325900N0850000E325900N0850001E325859N0850001E325859N0850000E", "NITF02.00"},
-    };
-    for (const Case& c : cases) {
-        SCOPED_TRACE(std::string(1, c.icords) + " " + c.igeolo);
-        TempFile file(nitfsample::build(georeferencedFile(c.icords, c.igeolo, 60, 80, {}, c.version)));
-        EXPECT_EQ(rewriteIgeolo(file.path()), c.igeolo);
-    }
+// (Every form's corners are written back on their own with the worked examples, and whole IGEOLO fields with
+// the corpus's images.)
+TEST(GeorefInfo, WritingKeepsTheFourCornersOfOnePixel) {
     // One pixel with four different corners (as a JPEG 2000 test file has it) keeps them all.
     const std::string single = "172330853807070172349753807070172349753805180172330853805180";
     TempFile one(nitfsample::build(georeferencedFile('N', single, 1, 1)));
@@ -470,42 +390,17 @@ TEST(GeorefInfo, WritingRefusesWhatItCannotWrite) {
     EXPECT_EQ(CNitfGeorefInfo::chooseIcords(nullptr, eNitfVersion20), 'N');
 }
 
-TEST(GeorefInfo, SensorModelWithItsChip) {
-    OpenedSample plain(georeferencedFile(0, "", 100, 100, {{"RPC00B", sampleRpc00b()}}));
-    std::unique_ptr<CNitfImageSource> image(plain.reader().getNewImageSource(0));
-    CNitfImageSubheader* subheader = image->getImageSubheader();
-    std::unique_ptr<CRpcSource> model(
-        subheader->getGeorefSource().getNewSensorModel(plain.reader().getInputStream(), subheader));
-    ASSERT_TRUE(model);
-    EXPECT_FALSE(model->hasChip());
-    double line, sample;
-    ASSERT_TRUE(model->groundToImage(45.1, 10.1, 0, &line, &sample));
-    EXPECT_NEAR(line, 0, 1e-9);
-    EXPECT_NEAR(sample, 1000, 1e-9);
-
-    OpenedSample chipped(
-        georeferencedFile(0, "", 100, 100, {{"ICHIPB", sampleIchipb()}, {"RPC00B", sampleRpc00b()}}));
-    image.reset(chipped.reader().getNewImageSource(0));
-    subheader = image->getImageSubheader();
-    model.reset(subheader->getGeorefSource().getNewSensorModel(chipped.reader().getInputStream(), subheader));
-    ASSERT_TRUE(model);
-    EXPECT_TRUE(model->hasChip());
-    ASSERT_TRUE(model->groundToImage(45.1, 10.1, 0, &line, &sample));
-    EXPECT_NEAR(line, -50, 1e-9);
-    EXPECT_NEAR(sample, 400, 1e-9);
-
+// (The model itself, with and without its chip, is checked with the GeoTIFF RPC tag.)
+TEST(GeorefInfo, SensorModelOnlyFromWholeRpcData) {
     CapturedWarnings warnings;
     OpenedSample cut(georeferencedFile(0, "", 100, 100, {{"RPC00B", sampleRpc00b().substr(0, 500)}}));
-    image.reset(cut.reader().getNewImageSource(0));
-    subheader = image->getImageSubheader();
-    EXPECT_EQ(subheader->getGeorefSource().getNewSensorModel(cut.reader().getInputStream(), subheader),
-              nullptr);
-    EXPECT_TRUE(warnings.contains("the RPC model is not used"));
     OpenedSample without(georeferencedFile(0, ""));
-    image.reset(without.reader().getNewImageSource(0));
-    subheader = image->getImageSubheader();
-    EXPECT_EQ(subheader->getGeorefSource().getNewSensorModel(without.reader().getInputStream(), subheader),
-              nullptr);
+    for (OpenedSample* file : {&cut, &without}) {
+        CNitfImageSubheader* subheader = file->source().getImageSubheader();
+        EXPECT_EQ(subheader->getGeorefSource().getNewSensorModel(file->reader().getInputStream(), subheader),
+                  nullptr);
+    }
+    EXPECT_EQ(warnings.count("the RPC model is not used"), 1);
 }
 
 // ---- the corpus -------------------------------------------------------------------------------------------
@@ -566,14 +461,12 @@ TEST(GeorefCorpus, IgeoloCornersMatchTheWorkedExamplesAndWriteBack) {
         int corner;
         double latitude, longitude;
     };
-    const Fact facts[] = {
-        {"nitf20/U_3050B.NTF", 0, -16.666111, 11.750000},
-        {"nitf20/U_3050B.NTF", 2, -20.000000, 12.990000},
-        {"jpeg2000/p0_13xa.ntf", 0, 34.370624, -83.902537},
-        {"jpeg2000/p0_13xa.ntf", 2, 34.354086, -83.881424},
-        {"misc/autzen-utm10.ntf", 0, 44.062222, -123.074722},
-        {"misc/20091021203850-01001116-VIS.ntf.r2", 0, 39.804, -84.146},
-    };
+    const Fact facts[] = {{"nitf20/U_3050B.NTF", 0, -16.666111, 11.750000},
+                          {"nitf20/U_3050B.NTF", 2, -20.000000, 12.990000},
+                          {"jpeg2000/p0_13xa.ntf", 0, 34.370624, -83.902537},
+                          {"jpeg2000/p0_13xa.ntf", 2, 34.354086, -83.881424},
+                          {"misc/autzen-utm10.ntf", 0, 44.062222, -123.074722},
+                          {"misc/20091021203850-01001116-VIS.ntf.r2", 0, 39.804, -84.146}};
     int checkedFacts = 0;
     for (const CorpusImage& image : images) {
         SCOPED_TRACE(image.relative + " image " + std::to_string(image.index));

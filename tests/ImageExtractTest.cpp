@@ -2,107 +2,63 @@
 // tool's extract command end to end.
 #include <gtest/gtest.h>
 
-#include <cstdlib>
 #include <fstream>
 #include <iostream>
-#include <memory>
+#include <map>
 #include <set>
-#include <sstream>
 #include <string>
 
-#include <nlohmann/json.hpp>
-
-#include "HostError.h"
 #include "Canonical.h"
-#include "NitfFileReader.h"
-#include "NitfImageSource.h"
-#include "NitfSampleWriter.h"
+#include "Manifest.h"
+#include "NitfTestFile.h"
 #include "Sha256.h"
 #include "TestFiles.h"
-
-TEST(Sha256, KnownDigests) {
-    EXPECT_EQ(Sha256::of(""), "e3b0c44298fc1c149afbf4c8996fb92427ae41e4649b934ca495991b7852b855");
-    EXPECT_EQ(Sha256::of("abc"), "ba7816bf8f01cfea414140de5dae2223b00361a396177a9cb410ff61f20015ad");
-    // 56 bytes: the length no longer fits in the first padded block.
-    EXPECT_EQ(Sha256::of("abcdbcdecdefdefgefghfghighijhijkijkljklmklmnlmnomnopnopq"),
-              "248d6a61d20638b8e5c026930c3e6039a33ce45964ff2167f6ecedd419db06c1");
-    Sha256 pieces;
-    const std::string million(1000000, 'a');
-    for (size_t at = 0; at < million.size(); at += 999)
-        pieces.update(million.substr(at, 999));
-    EXPECT_EQ(pieces.hex(), "cdc76e5c9914fb9281a1c7e284d73e67f1809a48a497200e046d39ccc7112cd0");
-}
 
 // Every corpus image whose pixels any correct decoder reproduces exactly (uncompressed, bi-level, VQ and
 // numerically lossless JPEG 2000) decodes through the tool's raw writer to the manifest's hashes: the
 // independent decoder's, or its documented alternative where the library's rules differ from that decoder's
 // (absent uncompressed blocks read as zeros; 12-bit samples unpacked most significant bit first).
 TEST(ImageCorpus, ExactImagesMatchTheManifest) {
-    const std::string root = corpusRoot();
-    if (root.empty())
-        GTEST_SKIP() << "no test corpus";
-    std::ifstream in(root + "/MANIFEST.json");
-    const nlohmann::json manifest = nlohmann::json::parse(in);
-    int images = 0, matched = 0, alternative = 0;
-    std::ostringstream report;
-    for (const auto& [path, file] : manifest.at("files").items()) {
-        if (!file.contains("images") || !file["images"].is_array())
-            continue;
-        for (const auto& image : file["images"]) {
-            static const std::set<std::string> exactCodes = {"NC", "NM", "C1", "M1", "C4", "M4", "C8", "M8"};
-            const std::string ic = image.value("IC", "");
-            const nlohmann::json decoded = image.at("oracle").value("decoded", nlohmann::json(false));
-            if (!exactCodes.count(ic) || !image.at("oracle").value("exact", false) || decoded == false)
+    SKIP_WITHOUT_CORPUS();
+    static const std::set<std::string> exactCodes = {"NC", "NM", "C1", "M1", "C4", "M4", "C8", "M8"};
+    int images = 0;
+    std::map<std::string, int> verdicts;
+    for (const CorpusFile& file : Manifest::get().files()) {
+        for (const nlohmann::json& image : file.entry->value("images", nlohmann::json::array())) {
+            const nlohmann::json& oracle = image.at("oracle");
+            // U_4004B: the reference decoder fails on it; a second decoder's result is given instead.
+            if (!exactCodes.count(image.value("IC", "")) || !oracle.value("exact", false) ||
+                (oracle.value("decoded", nlohmann::json(false)) == false && !oracle.contains("alt")))
                 continue;
             const int index = image.at("index").get<int>();
-            SCOPED_TRACE(path + " image " + std::to_string(index));
+            SCOPED_TRACE(file.relative + " image " + std::to_string(index));
             ++images;
             CanonicalImage bands;
-            ASSERT_NO_THROW(bands = canonicalImage(root + "/" + path, index));
-            const nlohmann::json& oracle = image.at("oracle");
-            report << "  " << path << " #" << index << " IMODE " << image.value("IMODE", "?") << " NBPP "
-                   << image.value("NBPP", 0) << ":";
+            ASSERT_NO_THROW(bands = canonicalImage(file.path, index));
             for (size_t band = 0; band < bands.bands.size(); ++band) {
                 const std::string digest = Sha256::of(bands.bands[band]);
                 const nlohmann::json& expected = oracle.at("bands").at(band);
-                std::string verdict = "FAIL";
-                if (expected.value("sha256", "") == digest) {
-                    verdict = "match";
-                    ++matched;
-                } else if (oracle.contains("alt")) {
-                    for (const auto& alt : oracle["alt"])
-                        if (alt.at("sha256").at(band) == digest)
-                            verdict = "alt";
-                    alternative += verdict == "alt" ? 1 : 0;
-                }
-                if (verdict == "FAIL" && expected.contains("decoded") && !expected["decoded"].get<bool>())
-                    verdict = "no oracle"; // the independent decoder failed on this band
+                std::string verdict = expected.value("sha256", "") == digest ? "match" : "FAIL";
+                for (const nlohmann::json& alt : oracle.value("alt", nlohmann::json::array()))
+                    if (verdict == "FAIL" && alt.at("sha256").at(band) == digest)
+                        verdict = "alt";
+                // The independent decoder failed on this band, and no other result is given.
+                if (verdict == "FAIL" && !oracle.contains("alt") && !expected.value("decoded", true))
+                    verdict = "no oracle";
                 EXPECT_NE(verdict, "FAIL") << "band " << band << " decodes to " << digest;
-                report << " " << verdict;
+                ++verdicts[verdict];
             }
             // Only an image whose data run past the end of the file has blocks that cannot be read whole.
             const bool cutShort =
                 image.at("data_offset").get<long long>() + image.at("data_length").get<long long>() >
-                file.at("size").get<long long>();
+                file.entry->at("size").get<long long>();
             EXPECT_EQ(bands.failedBlocks > 0, cutShort) << bands.firstError;
-            report << "\n";
         }
     }
     EXPECT_GT(images, 60);
-    std::cout << images << " images, " << matched << " bands match the oracle, " << alternative
-              << " its documented alternative:\n"
-              << report.str();
+    std::cout << images << " images; bands: " << verdicts["match"] << " match the oracle, " << verdicts["alt"]
+              << " its documented alternative, " << verdicts["no oracle"] << " have no oracle\n";
 }
-
-namespace {
-
-int runTool(const std::string& arguments) {
-    const std::string command = std::string(NITF_TOOL_PATH) + " " + arguments + " 2>/dev/null";
-    const int status = std::system(command.c_str());
-    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-}
-
-} // namespace
 
 TEST(ExtractTool, WritesCanonicalSamplesAndPictures) {
     nitfsample::Image image;
@@ -112,15 +68,16 @@ TEST(ExtractTool, WritesCanonicalSamplesAndPictures) {
     image.nbpp = 12;
     image.bands = 3;
     image.imode = 'S';
-    nitfsample::File file;
-    file.images = {image};
-    TempFile input(nitfsample::build(file));
+    TempFile input(nitfsample::build(fileOf(image)));
     TempFile output("", ".out");
+    auto extract = [&](const std::string& options) {
+        return runTool("extract " + input.path() + " " + options + " -o " + output.path());
+    };
 
-    ASSERT_EQ(runTool("extract " + input.path() + " -f raw -o " + output.path()), 0);
+    ASSERT_EQ(extract("-f raw"), 0);
     EXPECT_EQ(output.read(), nitfsample::canonicalBand(image, 0) + nitfsample::canonicalBand(image, 1) +
                                  nitfsample::canonicalBand(image, 2));
-    ASSERT_EQ(runTool("extract " + input.path() + " -i 0 -b 1 -f raw -o " + output.path()), 0);
+    ASSERT_EQ(extract("-i 0 -b 1 -f raw"), 0);
     EXPECT_EQ(output.read(), nitfsample::canonicalBand(image, 1));
 
     // A window of two bands in the order asked for; the same bytes streamed to a pipe.
@@ -131,31 +88,28 @@ TEST(ExtractTool, WritesCanonicalSamplesAndPictures) {
             part += whole.substr((row * 23 + 3) * 2, 10 * 2);
         return part;
     };
-    ASSERT_EQ(
-        runTool("extract " + input.path() + " --window 3,2,10,7 --bands 2,0 -j 2 -f raw -o " + output.path()),
-        0);
+    ASSERT_EQ(extract("--window 3,2,10,7 --bands 2,0 -j 2 -f raw"), 0);
     EXPECT_EQ(output.read(), cut(2) + cut(0));
     ASSERT_EQ(runTool("extract " + input.path() + " --window 3,2,10,7 --bands 2,0 -f raw -o - | cat > " +
                       output.path()),
               0);
     EXPECT_EQ(output.read(), cut(2) + cut(0));
-    EXPECT_EQ(runTool("extract " + input.path() + " --window 20,0,4,1 -f raw -o " + output.path()), 1)
-        << "a window past the edge";
-    EXPECT_EQ(runTool("extract " + input.path() + " --window 1,2,3 -f raw -o " + output.path()), 2);
+    EXPECT_EQ(extract("--window 20,0,4,1 -f raw"), 1) << "a window past the edge";
+    EXPECT_EQ(extract("--window 1,2,3 -f raw"), 2);
     EXPECT_EQ(runTool("extract --help"), 0);
 
-    ASSERT_EQ(runTool("extract " + input.path() + " -f png -o " + output.path()), 0);
+    ASSERT_EQ(extract("-f png"), 0);
     EXPECT_EQ(output.read().substr(0, 8), "\x89PNG\r\n\x1a\n");
-    ASSERT_EQ(runTool("extract " + input.path() + " -f pgm -o " + output.path()), 0);
+    ASSERT_EQ(extract("-f pgm"), 0);
     EXPECT_EQ(output.read().substr(0, 15), "P6\n23 17\n65535\n") << "RGB, 16 bits";
     EXPECT_EQ(output.read().size(), 15u + 23 * 17 * 3 * 2);
-    ASSERT_EQ(runTool("extract " + input.path() + " -b 2 -f pgm -o " + output.path()), 0);
+    ASSERT_EQ(extract("-b 2 -f pgm"), 0);
     EXPECT_EQ(output.read().substr(0, 3), "P5\n");
 
-    EXPECT_EQ(runTool("extract " + input.path() + " -f bmp -o " + output.path()), 2);
+    EXPECT_EQ(extract("-f bmp"), 2);
     EXPECT_EQ(runTool("extract " + input.path()), 2);
-    EXPECT_EQ(runTool("extract " + input.path() + " -b 3 -f raw -o " + output.path()), 1);
-    EXPECT_EQ(runTool("extract " + input.path() + " -i 1 -f raw -o " + output.path()), 1);
+    EXPECT_EQ(extract("-b 3 -f raw"), 1);
+    EXPECT_EQ(extract("-i 1 -f raw"), 1);
     std::remove(output.path().c_str());
     EXPECT_EQ(runTool("extract " + input.path() + "-missing -f raw -o " + output.path()), 1);
     EXPECT_FALSE(std::ifstream(output.path()).good()) << "no output is left behind after a failure";
@@ -164,9 +118,8 @@ TEST(ExtractTool, WritesCanonicalSamplesAndPictures) {
 // A CADRG frame as a picture: its colour table as the palette, absent subframes (the pad pixel, the first
 // code past the 216 colours) transparent.
 TEST(ExtractTool, CadrgFramesAreColouredWithNoDataClear) {
+    SKIP_WITHOUT_CORPUS();
     const std::string root = corpusRoot();
-    if (root.empty())
-        GTEST_SKIP() << "no test corpus";
     TempFile picture("", ".png");
     ASSERT_EQ(runTool("extract " + root + "/rpf/0000M033.GN3 -f png -o " + picture.path()), 0);
     const std::string png = picture.read();

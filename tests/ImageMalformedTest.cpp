@@ -2,16 +2,12 @@
 // an allocation the file cannot justify.
 #include <gtest/gtest.h>
 
-#include <memory>
+#include <sstream>
 #include <string>
 #include <vector>
 
-#include "HostError.h"
-#include "NitfFileReader.h"
-#include "NitfImageSource.h"
-#include "NitfLutSource.h"
-#include "NitfSampleWriter.h"
-#include "TestFiles.h"
+#include "NitfTestFile.h"
+#include "WalkFile.h"
 
 namespace {
 
@@ -23,31 +19,10 @@ std::string fileWith(const Image& image) {
     return nitfsample::build(file);
 }
 
-// Opens image 0 and reads every block of every band and its LUTs into buffers sized by the properties.
-// Returns the exception's message, or "" when everything was read.
+// Image 0 read as a careful application reads it: the message of its refusal, or "".
 std::string readEverything(const std::string& bytes) {
-    TempFile file(bytes);
-    CNitfFileReader reader;
-    if (!reader.open(file.path().c_str()))
-        return "cannot open";
-    try {
-        std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(0));
-        CNitfImagePropertiesIF& p = source->getImageProperties();
-        std::vector<char> block(static_cast<size_t>(std::max<long long>(
-            p.getTileBandBufferSize(), 1LL * p.getTileHeight() * p.getTileBandWidthBufferSize())));
-        for (int band = 0; band < p.getBandCount(); ++band)
-            for (int y = 0; y < p.getTileCountY(); ++y)
-                for (int x = 0; x < p.getTileCountX(); ++x)
-                    source->readTileNonInterleaved(&reader, block.data(), band, x, y);
-        for (int i = 0; i < source->getLutCount(); ++i) {
-            CNitfLutSource* lut = source->getLutSource(i);
-            std::vector<char> entries(static_cast<size_t>(lut->getSize()) + 1);
-            lut->readInterleaved(&reader, entries.data(), lut->getSize());
-        }
-    } catch (const vexo::Exception& e) {
-        return e.what();
-    }
-    return "";
+    OpenedSample file(bytes);
+    return readImage(file.reader(), 0);
 }
 
 Image smallImage() {
@@ -60,65 +35,33 @@ Image smallImage() {
 } // namespace
 
 TEST(ImageMalformed, GeometryBeyondTheFileIsRefused) {
-    using nitfsample::Overrides;
-    struct Case {
+    const struct {
         const char* what;
-        Overrides fields;
+        const char* fields; // NAME=VALUE ...
         int bands;
         char imode;
         const char* message;
-    };
-    const Case cases[] = {
-        {"blocks the data cannot hold", {{"NBPR", "9999"}, {"NBPC", "9999"}}, 1, 'B', "cannot hold"},
-        {"band-sequential blocks beyond an int",
-         {{"NBPR", "9999"}, {"NBPC", "9999"}},
-         22,
-         'S',
-         "too many blocks"},
-        {"a block beyond an int",
-         {{"NCOLS", "99999999"},
-          {"NROWS", "99999999"},
-          {"NPPBH", "0000"},
-          {"NPPBV", "0000"},
-          {"NBPR", "0001"},
-          {"NBPC", "0001"}},
-         1,
-         'B',
-         "too large"},
-        {"block rows beyond an int",
-         {{"NCOLS", "99999999"},
-          {"NPPBH", "0000"},
-          {"NPPBV", "0001"},
-          {"NBPP", "64"},
-          {"NBPR", "0001"},
-          {"NBPC", "0016"}},
-         9,
-         'B',
-         "too long"},
-        {"a pixel-interleaved block far larger than the file",
-         {{"NPPBH", "9999"}, {"NPPBV", "9999"}, {"NBPR", "0001"}, {"NBPC", "0001"}},
-         3,
-         'P',
-         "larger than the image data"},
+    } cases[] = {
+        {"blocks the data cannot hold", "NBPR=9999 NBPC=9999", 1, 'B', "cannot hold"},
+        {"band-sequential blocks beyond an int", "NBPR=9999 NBPC=9999", 22, 'S', "too many blocks"},
+        {"a block beyond an int", "NCOLS=99999999 NROWS=99999999 NPPBH=0000 NPPBV=0000 NBPR=0001 NBPC=0001",
+         1, 'B', "too large"},
+        {"block rows beyond an int", "NCOLS=99999999 NPPBH=0000 NPPBV=0001 NBPP=64 NBPR=0001 NBPC=0016", 9,
+         'B', "too long"},
+        {"a pixel-interleaved block far larger than the file", "NPPBH=9999 NPPBV=9999 NBPR=0001 NBPC=0001", 3,
+         'P', "larger than the image data"},
         {"a bi-level bitmap far larger than the file",
-         {{"NPPBH", "9999"},
-          {"NPPBV", "9999"},
-          {"NBPR", "0009"},
-          {"NBPC", "0009"},
-          {"NBPP", "01"},
-          {"PVTYPE", "B"}},
-         1,
-         'B',
-         "larger than the image data"},
-        {"no blocks", {{"NBPR", "0000"}}, 1, 'B', "Invalid image geometry"},
-        {"a negative block size", {{"NPPBV", "-001"}}, 1, 'B', "Invalid image geometry"},
-    };
-    for (const Case& c : cases) {
+         "NPPBH=9999 NPPBV=9999 NBPR=0009 NBPC=0009 NBPP=01 PVTYPE=B", 1, 'B', "larger than the image data"},
+        {"no blocks", "NBPR=0000", 1, 'B', "Invalid image geometry"},
+        {"a negative block size", "NPPBV=-001", 1, 'B', "Invalid image geometry"}};
+    for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
         Image image = smallImage();
         image.bands = c.bands;
         image.imode = c.imode;
-        image.fields = c.fields;
+        std::istringstream fields(c.fields);
+        for (std::string field; fields >> field;)
+            image.fields[field.substr(0, field.find('='))] = field.substr(field.find('=') + 1);
         const std::string message = readEverything(fileWith(image));
         EXPECT_NE(message.find(c.message), std::string::npos) << message;
     }
@@ -130,28 +73,23 @@ TEST(ImageMalformed, DataThatTheFileDoesNotHoldReadsAsZeros) {
     Image image = smallImage();
     image.bands = 2;
     std::string bytes = fileWith(image);
-    TempFile file(bytes.substr(0, bytes.size() - 2 * 128 - 10));
-    CNitfFileReader reader;
-    ASSERT_TRUE(reader.open(file.path().c_str()));
-    std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(0));
+    OpenedSample cut(bytes.substr(0, bytes.size() - 2 * 128 - 10));
+    CNitfImageSource& source = cut.source();
     std::vector<char> block(64, 'x');
-    ASSERT_TRUE(source->readTileNonInterleaved(&reader, block.data(), 1, 1, 0));
+    ASSERT_TRUE(source.readTileNonInterleaved(&cut.reader(), block.data(), 1, 1, 0));
     EXPECT_EQ(static_cast<unsigned char>(block[0]), nitfsample::sampleAt(image, 1, 0, 8));
     EXPECT_EQ(static_cast<unsigned char>(block[53]), nitfsample::sampleAt(image, 1, 6, 13));
     EXPECT_EQ(block[54], 0);
     EXPECT_EQ(block[63], 0);
-    ASSERT_TRUE(source->readTileNonInterleaved(&reader, block.data(), 1, 1, 1));
+    ASSERT_TRUE(source.readTileNonInterleaved(&cut.reader(), block.data(), 1, 1, 1));
     EXPECT_EQ(block, std::vector<char>(64, 0));
 
     // Block offsets pointing past the end of the file, and a table of them that is itself cut short.
     Image masked = smallImage();
     masked.ic = "NM";
     bytes = fileWith(masked);
-    TempFile first(bytes);
-    CNitfFileReader probe;
-    ASSERT_TRUE(probe.open(first.path().c_str()));
     const size_t mask =
-        static_cast<size_t>(probe.getFileHeader()->getImageHeaderDataPair(0)->getDataOffset()) + 10;
+        static_cast<size_t>(OpenedSample(bytes).header()->getImageHeaderDataPair(0)->getDataOffset()) + 10;
     bytes.replace(mask + 4, 4, std::string("\x7F\xFF\xFF\x00", 4));
     EXPECT_EQ(readEverything(bytes), "");
     EXPECT_NE(readEverything(bytes.substr(0, mask + 6)).find("block mask"), std::string::npos);
@@ -162,18 +100,12 @@ TEST(ImageMalformed, AnUnknownInterleavingLeavesEveryBlockAbsent) {
     Image unknown = smallImage();
     unknown.bands = 3;
     unknown.fields = {{"IMODE", "X"}};
-    {
-        TempFile file(fileWith(unknown));
-        CNitfFileReader reader;
-        ASSERT_TRUE(reader.open(file.path().c_str()));
-        std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(0));
-        ASSERT_TRUE(source);
-        EXPECT_EQ(source->getTileOffset(0), 0u);
-        EXPECT_TRUE(source->isBlockAbsent(0, 0, 0));
-        std::vector<char> block(64, 'x');
-        EXPECT_FALSE(source->readTileNonInterleaved(&reader, block.data(), 0, 0, 0));
-        EXPECT_EQ(block, std::vector<char>(64, 0));
-    }
+    OpenedSample file(unknown);
+    EXPECT_EQ(file.source().getTileOffset(0), 0u);
+    EXPECT_TRUE(file.source().isBlockAbsent(0, 0, 0));
+    std::vector<char> block(64, 'x');
+    EXPECT_FALSE(file.source().readTileNonInterleaved(&file.reader(), block.data(), 0, 0, 0));
+    EXPECT_EQ(block, std::vector<char>(64, 0));
 
     // Look-up tables longer than the rest of the file: the fields after them read as blanks past the end,
     // so the image has no geometry to read it by.

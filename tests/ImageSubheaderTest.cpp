@@ -8,27 +8,16 @@
 #include "NitfImageSubheaderV21.h"
 #include "NitfTestFile.h"
 
-using nitfsample::File;
 using nitfsample::Image;
 
 namespace {
 
 // Builds a one-image file and reads the image's sub-header back.
 struct ReadImage {
-    explicit ReadImage(const Image& image, const std::string& version = "NITF02.10")
-        : sample(fileWith(image, version)) {
-        subheader.reset(sample.header()->getNewImageSubheader(sample.reader().getInputStream(), 0));
-    }
-    static File fileWith(const Image& image, const std::string& version) {
-        File file;
-        file.version = version;
-        file.images.push_back(image);
-        return file;
-    }
-    std::string field(const char* name) {
-        CNitfProperty* value = FindProperty(subheader->getProperties(), name);
-        return value ? value->toText() : "<absent>";
-    }
+    explicit ReadImage(const Image& image)
+        : sample(image),
+          subheader(sample.header()->getNewImageSubheader(sample.reader().getInputStream(), 0)) {}
+    std::string field(const char* name) { return fieldText(subheader->getProperties(), name); }
     OpenedSample sample;
     std::unique_ptr<CNitfImageSubheader> subheader;
 };
@@ -59,12 +48,8 @@ TEST(ImageSubheader, BandFieldNamesFollowTheBandCount) {
     Image image = small(12);
     image.irep = "MULTI";
     ReadImage read(image);
-    EXPECT_EQ(read.field("NBANDS"), "0");
     EXPECT_EQ(read.field("XBANDS"), "00012");
-    EXPECT_EQ(read.subheader->getBandCount(), 12);
-    EXPECT_NE(read.field("IREPBAND01"), "<absent>");
-    EXPECT_NE(read.field("ISUBCAT12"), "<absent>");
-    EXPECT_EQ(read.field("IREPBAND1"), "<absent>");
+    EXPECT_EQ(read.field("IREPBAND1"), "<absent>") << "two-digit names from 10 bands on";
 }
 
 TEST(ImageSubheader, CompressionRateIsReadOnlyForTheClosedList) {
@@ -101,23 +86,7 @@ TEST(ImageSubheader, LookUpTablesByRepresentation) {
     DKFRead(&first, 1, 1, fp);
     EXPECT_EQ(first, '\x07') << "the entry offset is that of the table's first byte";
 
-    // A palette of three tables: entries come back interleaved, entry e from bytes e, e + n, e + 2n.
-    Image palette = small();
-    palette.irep = "RGB/LUT";
-    palette.bandInfo.resize(1);
-    palette.bandInfo[0].luts = {std::string("\x01\x02\x03", 3), std::string("\x11\x12\x13", 3),
-                                std::string("\x21\x22\x23", 3)};
-    ReadImage paletteRead(palette);
-    ASSERT_EQ(paletteRead.subheader->getLutCount(), 1);
-    CNitfLutSource* rgb = paletteRead.subheader->getLutSource(0);
-    EXPECT_EQ(rgb->getSize(), 9);
-    char entries[9];
-    rgb->readInterleaved(&paletteRead.sample.reader(), entries, 9);
-    EXPECT_EQ(std::string(entries, 6), std::string("\x01\x11\x21\x02\x12\x22", 6));
-    rgb->setInterleaving(true);
-    rgb->readInterleaved(&paletteRead.sample.reader(), entries, 9);
-    EXPECT_EQ(std::string(entries, 3), std::string("\x01\x02\x03", 3)) << "stored bytes unchanged";
-
+    // (A palette's entries come back interleaved: see the corpus frames' colour tables.)
     Image rgbBands = small(3);
     rgbBands.irep = "RGB";
     rgbBands.bandInfo.resize(3);
@@ -155,16 +124,8 @@ TEST(ImageSubheader, CommentsCornersTitleAndLevels) {
     EXPECT_EQ(subheader.getImageAttachment(), 0) << "the attachment level is looked up as LALVL";
 }
 
-TEST(ImageSubheader, StorageLengthAndWriting) {
-    // Blank ICORDS: no IGEOLO, and the written layout starts from 375 bytes.
-    Image plain = small();
-    ReadImage read(plain);
-    EXPECT_EQ(read.subheader->getGeorefSource().getCoordinateType(), CNitfGeorefInfo::eCoordinatesNone);
-    EXPECT_EQ(read.subheader->computeStorageLength(), 375 + 1 + 13 + 45 + 5);
-    ByteStream out("");
-    read.subheader->write(out);
-    EXPECT_EQ(DKFTell(out), read.subheader->computeStorageLength());
-
+// (Sub-headers read from the corpus are written back at their storage length in the record round trips.)
+TEST(ImageSubheader, ExtendedAreaTresAreWrittenToTheUserArea) {
     // TREs read from the extended area are written into the user-defined area, and the old extended length is
     // still counted (the over-count is kept).
     Image tagged = small();
@@ -175,11 +136,9 @@ TEST(ImageSubheader, StorageLengthAndWriting) {
     EXPECT_EQ(subheader.getTaggedRecords().front()->getSource(), CNitfTag::eTagSourceImage);
     ByteStream written("");
     subheader.write(written);
-    long long length = DKFTell(written);
-    EXPECT_EQ(subheader.computeStorageLength(), length + 19) << "over-counted by the old IXSHDL";
-    std::string bytes(static_cast<size_t>(length), '\0');
-    DKFSeek64(written, 0, SEEK_SET);
-    DKFRead(&bytes[0], 1, bytes.size(), written);
+    const std::string bytes = written.contents();
+    EXPECT_EQ(subheader.computeStorageLength(), static_cast<long long>(bytes.size()) + 19)
+        << "over-counted by the old IXSHDL";
     EXPECT_EQ(bytes.substr(bytes.size() - 29), "00019000ABCDEF00005" + std::string(5, '\0') + "00000")
         << "UDIDL, UDOFL, the TRE header and its skipped data, then IXSHDL 00000";
 

@@ -1,14 +1,14 @@
-// Every JPEG 2000 image of the conformance corpus decodes through the JPEG 2000 source, block by block. Where
-// the manifest's reference pixels are exact (numerically lossless codestreams), the samples match them bit
-// for bit; elsewhere (lossy codestreams, where decoders may round differently) their statistics match within
-// a tolerance. Set NITF_J2K_PICTURES to a directory to get a picture of every image there.
+// The JPEG 2000 images of the conformance corpus that are not decoded exactly (those are checked with the
+// other exactly decoded images) decode through the JPEG 2000 source, block by block: where the reference
+// keeps negative samples on a second route, bit for bit; elsewhere (lossy codestreams, where decoders may
+// round differently) their statistics match within a tolerance.
 #include <gtest/gtest.h>
 
 #include <cmath>
 #include <cstdlib>
 #include <iostream>
+#include <map>
 #include <memory>
-#include <set>
 #include <string>
 
 #include "HostError.h"
@@ -50,90 +50,65 @@ std::vector<std::vector<int32_t>> ycbcrToRgb(const wholesamples::Image& image) {
     return rgb;
 }
 
-std::string statsText(const Stats& s) {
-    char text[160];
-    std::snprintf(text, sizeof text, "min %g max %g mean %.3f stddev %.3f", s.min, s.max, s.mean, s.stddev);
-    return text;
-}
-
 } // namespace
 
 TEST(Jpeg2000Corpus, EveryJpeg2000ImageDecodes) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
-    const char* pictures = std::getenv("NITF_J2K_PICTURES");
-    int images = 0, exact = 0, close = 0, unreferenced = 0;
+    std::map<std::string, int> verdicts;
     for (const CorpusFile& corpusFile : manifest.files()) {
         for (const nlohmann::json& image : corpusFile.entry->value("images", nlohmann::json::array())) {
             const std::string ic = image.value("IC", "");
-            if (ic != "C8" && ic != "M8")
+            if ((ic != "C8" && ic != "M8") || image.at("oracle").value("exact", false))
                 continue;
             const int index = image.at("index").get<int>();
-            const std::string name = corpusFile.relative + " image " + std::to_string(index);
-            SCOPED_TRACE(name);
+            SCOPED_TRACE(corpusFile.relative + " image " + std::to_string(index));
             CNitfFileReader reader;
             ASSERT_TRUE(reader.open(corpusFile.path.c_str()));
             std::unique_ptr<CNitfImageSource> source;
             ASSERT_NO_THROW(source.reset(reader.getNewImageSource(index)));
             ASSERT_NE(dynamic_cast<CNitfImageSourceJpeg2000*>(source.get()), nullptr);
-            ++images;
             wholesamples::Image decoded;
             ASSERT_NO_THROW(decoded = wholesamples::readBlocks(reader, *source));
-            if (pictures) {
-                std::string stem = corpusFile.relative.substr(corpusFile.relative.find('/') + 1);
-                wholesamples::writePicture(decoded, std::string(pictures) + "/" + stem + ".pnm");
-            }
 
             const nlohmann::json& oracle = image.at("oracle");
             const int bytes = (image.at("NBPP").get<int>() + 7) / 8;
             const int bands = static_cast<int>(decoded.bands.size());
-            std::string verdict;
             if (oracle.value("decoded", false) != true) {
                 // No reference pixels: the reference decoder cannot open these (sub-sampled components, image
                 // and tile offsets). They must still decode to a picture.
                 for (int band = 0; band < bands; ++band)
                     EXPECT_GT(wholesamples::statsOf(decoded.bands[size_t(band)]).stddev, 1.0)
                         << "band " << band;
-                verdict = "no oracle ";
-                ++unreferenced;
+                ++verdicts["without reference pixels"];
             } else if (oracle.contains("alt")) {
                 // The reference clamps negative samples; its second route keeps them, as the library does.
                 for (int band = 0; band < bands; ++band)
                     EXPECT_EQ(Sha256::of(wholesamples::canonical(decoded, band, bytes)),
                               oracle.at("alt").at(0).at("sha256").at(band))
                         << "band " << band;
-                verdict = "exact (alt)";
-                ++exact;
+                ++verdicts["exact"];
             } else if (oracle.contains("conversion") &&
                        oracle.value("conversion", "").rfind("none", 0) != 0) {
                 const auto rgb = ycbcrToRgb(decoded);
                 for (int band = 0; band < 3; ++band)
                     expectClose(wholesamples::statsOf(rgb[size_t(band)]), oracle.at("bands").at(band),
                                 "band " + std::to_string(band) + " as RGB");
-                verdict = "close (RGB)";
-                ++close;
-            } else if (oracle.value("exact", false)) {
-                for (int band = 0; band < bands; ++band)
-                    EXPECT_EQ(Sha256::of(wholesamples::canonical(decoded, band, bytes)),
-                              oracle.at("bands").at(band).at("sha256"))
-                        << "band " << band;
-                verdict = "exact      ";
-                ++exact;
+                ++verdicts["within tolerance as RGB"];
             } else {
                 for (int band = 0; band < bands; ++band)
                     expectClose(wholesamples::statsOf(decoded.bands[size_t(band)]),
                                 oracle.at("bands").at(band), "band " + std::to_string(band));
-                verdict = "close      ";
-                ++close;
+                ++verdicts["within tolerance"];
             }
-            std::cout << "  " << verdict << " " << name << ": "
-                      << statsText(wholesamples::statsOf(decoded.bands[0])) << "\n";
         }
     }
-    EXPECT_GE(images, 36);
-    std::cout << images << " JPEG 2000 images: " << exact << " exact, " << close << " within tolerance, "
-              << unreferenced << " without reference pixels\n";
+    int images = 0;
+    for (const auto& [verdict, count] : verdicts) {
+        std::cout << count << " " << verdict << "\n";
+        images += count;
+    }
+    EXPECT_GE(images, 20);
 }
 
 namespace {
@@ -163,19 +138,14 @@ bool readPgx(const std::string& path, Pgx& pgx) {
     return true;
 }
 
-bool haveCommand(const char* name) {
-    return std::system((std::string("command -v ") + name + " > /dev/null 2>&1").c_str()) == 0;
-}
-
 } // namespace
 
 // The images the manifest has no pixels for (sub-sampled components, image and tile offsets, packed packet
 // headers) against OpenJPEG's own command-line decoder, component by component: a band on the image grid is
 // its component exactly; a sub-sampled component is replicated over the pixels its samples cover.
 TEST(Jpeg2000Corpus, ImagesWithoutReferencePixelsMatchTheOpenJpegTool) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
     if (!haveCommand("opj_decompress"))
         GTEST_SKIP() << "opj_decompress is not installed";
     int checked = 0;

@@ -2,8 +2,6 @@
 // images of every kind and the corpus's decodable images read back by GDAL, and nitf extract -f tiff.
 #include <gtest/gtest.h>
 
-#include <cmath>
-#include <cstdlib>
 #include <cstring>
 #include <memory>
 #include <string>
@@ -24,8 +22,6 @@
 #include "Sha256.h"
 #include "TestFiles.h"
 #include "TreBytes.h"
-
-#include <sys/wait.h>
 
 using namespace nitfpicture;
 
@@ -69,11 +65,6 @@ std::string joined(const std::vector<std::string>& lines) {
     return text;
 }
 
-#define GDAL_VIEW(view, paths)                                                                               \
-    std::optional<nlohmann::json> view = gdalView(paths);                                                    \
-    if (!view)                                                                                               \
-    GTEST_SKIP() << "GDAL's Python bindings (python3-gdal) are not installed"
-
 } // namespace
 
 TEST(GeorefReport, TextAndJsonOfEachKindOfImage) {
@@ -92,47 +83,29 @@ TEST(GeorefReport, TextAndJsonOfEachKindOfImage) {
     const double gt[6] = {-20.1, 0.2, 0, 20.2, 0, -0.4};
     for (int i = 0; i < 6; ++i)
         EXPECT_NEAR(g.geotransform[i], gt[i], 1e-12) << i;
-    const std::string text = joined(nitfgeoref::reportLines(g));
-    EXPECT_NE(text.find("Coordinates: ICORDS \"G\" (geographic), corners from IGEOLO\n"), std::string::npos)
-        << text;
-    EXPECT_NE(
-        text.find("corner 3 (last row, last column, row 100, column 200): -20.00000000, +20.00000000\n"),
-        std::string::npos)
-        << text;
-    EXPECT_NE(text.find("Projection: GEO on WGS 84\n"), std::string::npos) << text;
-    EXPECT_NE(text.find("geotransform: origin -20.1, 20.2; pixel 0.2 x -0.4; rotation 0, 0\n"),
-              std::string::npos)
-        << text;
-    EXPECT_NE(text.find("Sensor model: RPC00B, through ICHIPB\n"), std::string::npos) << text;
     const nlohmann::json json = nitfgeoref::reportJson(g);
-    EXPECT_EQ(json["icords"], "G");
-    EXPECT_EQ(json["coordinate_type"], "geographic");
     EXPECT_EQ(json["corner_source"], "IGEOLO");
-    ASSERT_EQ(json["corners"].size(), 4u);
     EXPECT_EQ(json["corners"][1]["column"], 200);
     EXPECT_EQ(json["corners"][1]["latitude"], 20.0);
-    EXPECT_EQ(json["projection"]["system"], "GEO");
-    EXPECT_EQ(json["projection"]["geotransform"].size(), 6u);
     EXPECT_EQ(json["sensor_model"], nlohmann::json({{"type", "RPC00B"}, {"valid", true}, {"chip", true}}));
-
     const nitfgeoref::Summary n = summaryOf(sample, 1);
-    const std::string utm = joined(nitfgeoref::reportLines(n));
-    EXPECT_NE(utm.find("+34.37062"), std::string::npos) << utm;
-    EXPECT_NE(utm.find("(E 233085.000, N 3807070.000)"), std::string::npos) << utm;
-    EXPECT_NE(utm.find("Projection: UTM 17N on WGS 84"), std::string::npos) << utm;
-    const nlohmann::json utmJson = nitfgeoref::reportJson(n);
-    EXPECT_EQ(utmJson["projection"]["zone"], 17);
-    EXPECT_EQ(utmJson["projection"]["hemisphere"], "N");
-    EXPECT_FALSE(utmJson.contains("sensor_model"));
-
+    EXPECT_EQ(nitfgeoref::reportJson(n)["projection"]["zone"], 17);
     const nitfgeoref::Summary skew = summaryOf(sample, 2);
     EXPECT_FALSE(skew.axisAligned);
-    EXPECT_NE(joined(nitfgeoref::reportLines(skew)).find("tie points: the four corners"), std::string::npos);
     EXPECT_EQ(nitfgeoref::reportJson(skew)["projection"]["tie_points"], true);
-
     const nitfgeoref::Summary none = summaryOf(sample, 3);
-    EXPECT_EQ(nitfgeoref::reportLines(none), std::vector<std::string>{"Coordinates: none"});
     EXPECT_EQ(nitfgeoref::reportJson(none), nlohmann::json({{"icords", " "}, {"coordinate_type", "none"}}));
+
+    // The text says the same for people.
+    const std::string text = joined(nitfgeoref::reportLines(g)) + joined(nitfgeoref::reportLines(n)) +
+                             joined(nitfgeoref::reportLines(skew)) + joined(nitfgeoref::reportLines(none));
+    for (const char* line :
+         {"Coordinates: ICORDS \"G\" (geographic), corners from IGEOLO\n",
+          "corner 3 (last row, last column, row 100, column 200): -20.00000000, +20.00000000\n",
+          "geotransform: origin -20.1, 20.2; pixel 0.2 x -0.4; rotation 0, 0\n",
+          "Sensor model: RPC00B, through ICHIPB\n", "(E 233085.000, N 3807070.000)",
+          "Projection: UTM 17N on WGS 84", "tie points: the four corners", "Coordinates: none"})
+        EXPECT_NE(text.find(line), std::string::npos) << line << "\n" << text;
 }
 
 TEST(NitfGeoTiff, RpcTagInTheImagesPixels) {
@@ -177,6 +150,12 @@ TEST(NitfGeoTiff, RpcTagInTheImagesPixels) {
 
 namespace {
 
+uint64_t bitsOf(float value) {
+    uint32_t bits;
+    std::memcpy(&bits, &value, 4);
+    return bits;
+}
+
 // One band of the sample writer's image in canonical form, hashed.
 std::string canonicalSha(const nitfsample::Image& image, int band) {
     return Sha256::of(nitfsample::canonicalBand(image, band));
@@ -205,41 +184,20 @@ TEST(NitfGeoTiff, SyntheticImagesOfEveryKindReadBackThroughGdal) {
     masked.padCodeBits = 8;
     masked.padValue = 7;
     file.images.push_back(masked);
-    // Signed 16-bit band-sequential, 32-bit reals pixel-interleaved, complex, 12-bit.
-    nitfsample::Image signed16 =
-        imageWith('D', "+39.804-084.146+39.804-084.076+39.756-084.076+39.756-084.146", 30, 41);
-    signed16.bands = 3;
-    signed16.nbpp = 16;
-    signed16.pvtype = "SI";
-    signed16.imode = 'S';
-    file.images.push_back(signed16);
+    // 32-bit reals pixel-interleaved, complex. (Signed samples are written with every sample type.)
     nitfsample::Image reals = imageWith(0, "", 17, 19);
     reals.bands = 2;
     reals.nbpp = 32;
     reals.pvtype = "R";
     reals.imode = 'P';
     reals.irep = "MULTI";
-    reals.sample = [](int band, int row, int col) {
-        const float v = band * 100.5f + row * 0.25f - col;
-        uint32_t bits;
-        std::memcpy(&bits, &v, 4);
-        return static_cast<uint64_t>(bits);
-    };
+    reals.sample = [](int band, int row, int col) { return bitsOf(band * 100.5f + row * 0.25f - col); };
     file.images.push_back(reals);
     nitfsample::Image complex = imageWith(0, "", 9, 13);
     complex.nbpp = 64;
     complex.pvtype = "C";
-    complex.sample = [](int, int row, int col) {
-        const float re = row * 1.5f, im = -col * 0.75f;
-        uint32_t a, b;
-        std::memcpy(&a, &re, 4);
-        std::memcpy(&b, &im, 4);
-        return (static_cast<uint64_t>(a) << 32) | b;
-    };
+    complex.sample = [](int, int row, int col) { return bitsOf(row * 1.5f) << 32 | bitsOf(-col * 0.75f); };
     file.images.push_back(complex);
-    nitfsample::Image twelve = imageWith(0, "", 21, 33);
-    twelve.nbpp = 12;
-    file.images.push_back(twelve);
     OpenedSample sample(file);
 
     std::vector<std::unique_ptr<TempFile>> outputs;
@@ -257,7 +215,7 @@ TEST(NitfGeoTiff, SyntheticImagesOfEveryKindReadBackThroughGdal) {
         paths.push_back(outputs.back()->path());
     }
     GDAL_VIEW(view, paths);
-    const char* types[] = {"Byte", "Byte", "Int16", "Float32", "CFloat32", "UInt16"};
+    const char* types[] = {"Byte", "Byte", "Float32", "CFloat32"};
     for (size_t i = 0; i < paths.size(); ++i) {
         SCOPED_TRACE("image " + std::to_string(i));
         const nlohmann::json& tif = (*view)[i];
@@ -286,23 +244,18 @@ TEST(NitfGeoTiff, SyntheticImagesOfEveryKindReadBackThroughGdal) {
     EXPECT_EQ(second["gcp_epsg"], 32617);
     ASSERT_EQ(second["gcps"].size(), 4u);
     EXPECT_EQ(second["gcps"][1], nlohmann::json::array({63.5, 0.5, 234975.0, 3807170.0}));
-    EXPECT_TRUE((*view)[3]["geotransform"].is_null());
+    EXPECT_TRUE((*view)[2]["geotransform"].is_null());
 }
 
 TEST(NitfGeoTiff, ExtractCommandWritesCogFiles) {
     TempFile input(nitfsample::build(nitfsample::defaultSample()));
     TempFile output("", ".tif");
-    const std::string command = std::string(NITF_TOOL_PATH) + " extract '" + input.path() +
-                                "' -f tiff --cog --compress zstd -o '" + output.path() + "' 2>&1";
-    ASSERT_EQ(std::system(command.c_str()), 0) << command;
-    const std::string tif = readWholeFile(output.path());
-    ASSERT_GE(tif.size(), 8u);
-    EXPECT_EQ(tif.substr(0, 4), std::string("II*\0", 4));
-    for (const char* bad : {" -f png --cog -o x.png", " -f tiff --compress lzw -o x.tif", " -f tiff -o -"}) {
-        const std::string usage =
-            std::string(NITF_TOOL_PATH) + " extract '" + input.path() + "'" + bad + " 2>/dev/null";
-        EXPECT_EQ(WEXITSTATUS(std::system(usage.c_str())), 2) << bad;
-    }
+    ASSERT_EQ(
+        runTool("extract '" + input.path() + "' -f tiff --cog --compress zstd -o '" + output.path() + "'"),
+        0);
+    EXPECT_EQ(output.read().substr(0, 4), std::string("II*\0", 4));
+    for (const char* bad : {" -f png --cog -o x.png", " -f tiff --compress lzw -o x.tif", " -f tiff -o -"})
+        EXPECT_EQ(runTool("extract '" + input.path() + "'" + bad), 2) << bad;
     GDAL_VIEW(view, {output.path()});
     EXPECT_EQ((*view)[0]["cog_errors"], nlohmann::json::array());
     EXPECT_EQ((*view)[0]["width"], 256);
@@ -310,9 +263,8 @@ TEST(NitfGeoTiff, ExtractCommandWritesCogFiles) {
 }
 
 TEST(GeoTiffCorpus, DecodedImagesOpenInGdalWithTheirPixelsAndCorners) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
     struct Written {
         std::string name;
         std::vector<std::string> shas;
@@ -321,8 +273,7 @@ TEST(GeoTiffCorpus, DecodedImagesOpenInGdalWithTheirPixelsAndCorners) {
     std::vector<Written> written;
     std::vector<std::unique_ptr<TempFile>> outputs;
     std::vector<std::string> paths;
-    vexo::nspio::Warning::Handler previous =
-        vexo::nspio::Warning::setHandler([](const char*, const char*, int) {});
+    CapturedWarnings quiet;
     for (const CorpusFile& file : manifest.wellFormed()) {
         const nlohmann::json& entry = *file.entry;
         if (!entry.contains("images") || !entry["images"].is_array())
@@ -363,7 +314,6 @@ TEST(GeoTiffCorpus, DecodedImagesOpenInGdalWithTheirPixelsAndCorners) {
             paths.push_back(outputs.back()->path());
         }
     }
-    vexo::nspio::Warning::setHandler(previous);
     ASSERT_GT(written.size(), 40u);
     GDAL_VIEW(view, paths);
     int georeferenced = 0;

@@ -24,9 +24,8 @@ std::vector<size_t> cutPoints(size_t size) {
 } // namespace
 
 TEST(Robustness, MalformedCorpusFilesAreReadOrRefused) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
     for (const CorpusFile& file : manifest.files()) {
         if (file.entry->value("malformed", false))
             walkFile(file.path);
@@ -34,9 +33,8 @@ TEST(Robustness, MalformedCorpusFilesAreReadOrRefused) {
 }
 
 TEST(Robustness, TruncatedFilesAreReadOrRefused) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
     TempFile scratch;
     for (const CorpusFile& file : manifest.files()) {
         std::string bytes = readWholeFile(file.path);
@@ -49,9 +47,8 @@ TEST(Robustness, TruncatedFilesAreReadOrRefused) {
 }
 
 TEST(Robustness, FilesWithFlippedHeaderBytesAreReadOrRefused) {
+    SKIP_WITHOUT_CORPUS();
     const Manifest& manifest = Manifest::get();
-    if (manifest.empty())
-        GTEST_SKIP() << "no test corpus";
     std::mt19937 random(20261121);
     TempFile scratch;
     for (const CorpusFile& file : manifest.files()) {

@@ -15,19 +15,9 @@ namespace {
 
 // Offsets and scales: line 1000 + 1000 r, sample 2000 + 2000 c, P = (lat - 45) / 0.1, L = (lon - 10) / 0.2,
 // H = (h - 100) / 500.
-const std::string kNormalisation = "1"
-                                   "0001.00"
-                                   "0000.50"
-                                   "001000"
-                                   "02000"
-                                   "+45.0000"
-                                   "+010.0000"
-                                   "+0100"
-                                   "001000"
-                                   "02000"
-                                   "+00.1000"
-                                   "+000.2000"
-                                   "+0500";
+const std::string kNormalisation =
+    joined({"1", "0001.00", "0000.50", "001000", "02000", "+45.0000", "+010.0000", "+0100", "001000", "02000",
+            "+00.1000", "+000.2000", "+0500"});
 
 // 20 coefficients of 12 characters, all zero but the given 1-based terms.
 std::string polynomial(std::initializer_list<std::pair<int, const char*>> terms) {
@@ -132,13 +122,8 @@ TEST(RpcSource, ChipCoordinatesThroughIchipb) {
         grid += number12(point[0]) + number12(point[1]);
     for (const auto& point : chip)
         grid += number12(2 * point[0] + 500) + number12(2 * point[1] + 1000);
-    auto ichipb = parseTre("ICHIPB", "00"
-                                     "0000.50000"
-                                     "00"
-                                     "00" +
-                                         grid +
-                                         "00003000"
-                                         "00004000");
+    auto ichipb = parseTre("ICHIPB", joined({"00", "0000.50000", "00", "00"}) + grid +
+                                         joined({"00003000", "00004000"}));
 
     CRpcSource rpc = read("RPC00B", model(11));
     ASSERT_TRUE(rpc.setChip(ichipb.get()));
@@ -152,13 +137,8 @@ TEST(RpcSource, ChipCoordinatesThroughIchipb) {
     EXPECT_NEAR(lon, 10.1, 1e-9);
 
     // Grid points that collapse to a line define no mapping.
-    auto flat = parseTre("ICHIPB", "00"
-                                   "0000.50000"
-                                   "00"
-                                   "00" +
-                                       std::string(192, '0') +
-                                       "00003000"
-                                       "00004000");
+    auto flat = parseTre("ICHIPB", joined({"00", "0000.50000", "00", "00"}) + std::string(192, '0') +
+                                       joined({"00003000", "00004000"}));
     CRpcSource other = read("RPC00B", model(11));
     EXPECT_FALSE(other.setChip(flat.get()));
     EXPECT_FALSE(other.hasChip());

@@ -3,7 +3,6 @@
 // against the manifest's colour tables, transparent codes and location codes.
 #include <gtest/gtest.h>
 
-#include <cmath>
 #include <memory>
 #include <string>
 #include <vector>
@@ -44,8 +43,7 @@ std::pair<double, double> corner(const std::string& igeolo, int index) {
 } // namespace
 
 TEST(RpfFrame, CorpusFramesDescribeThemselves) {
-    if (Manifest::get().empty())
-        GTEST_SKIP() << "no test corpus";
+    SKIP_WITHOUT_CORPUS();
     for (const char* relative : kFrames) {
         SCOPED_TRACE(relative);
         const nlohmann::json* entry = entryOf(relative);

@@ -4,7 +4,7 @@
 // refused with a clear message before anything they claim is followed or allocated.
 #include <gtest/gtest.h>
 
-#include <cstring>
+#include <cstdio>
 #include <memory>
 #include <string>
 #include <vector>
@@ -17,6 +17,7 @@
 #include "RpfTables.h"
 #include "SerializerFileRaw.h"
 #include "TestFiles.h"
+#include "TreBytes.h"
 
 namespace {
 
@@ -34,28 +35,19 @@ std::string readRaw(const std::string& bytes, CRpfSource* into = nullptr) {
     return "";
 }
 
-void expectSameDescription(const RPFBoundaryRectangle_t& read, const RPFBoundaryRectangle_t& written) {
-    EXPECT_STREQ(read.productDataType, written.productDataType);
-    EXPECT_STREQ(read.compressionRatio, written.compressionRatio);
-    EXPECT_STREQ(read.scale, written.scale);
-    EXPECT_EQ(read.zone, written.zone);
-    EXPECT_STREQ(read.producer, written.producer);
-    // Corners as they were; intervals through the per-pixel form of the records.
-    for (double RPFBoundaryRectangle_t::*value :
-         {&RPFBoundaryRectangle_t::upperLeftLatitude, &RPFBoundaryRectangle_t::upperLeftLongitude,
-          &RPFBoundaryRectangle_t::lowerLeftLatitude, &RPFBoundaryRectangle_t::lowerLeftLongitude,
-          &RPFBoundaryRectangle_t::upperRightLatitude, &RPFBoundaryRectangle_t::upperRightLongitude,
-          &RPFBoundaryRectangle_t::lowerRightLatitude, &RPFBoundaryRectangle_t::lowerRightLongitude})
-        EXPECT_EQ(read.*value, written.*value);
-    EXPECT_DOUBLE_EQ(read.verticalInterval, written.verticalInterval);
-    EXPECT_DOUBLE_EQ(read.horizontalInterval, written.horizontalInterval);
-    EXPECT_EQ(read.verticalFrames, written.verticalFrames);
-    EXPECT_EQ(read.horizontalFrames, written.horizontalFrames);
-    ASSERT_EQ(read.frameCount, written.frameCount);
-    for (int i = 0; i < read.frameCount; ++i)
-        EXPECT_EQ(read.frameFiles[i] ? std::string(read.frameFiles[i]) : "-",
-                  written.frameFiles[i] ? std::string(written.frameFiles[i]) : "-")
-            << "frame " << i;
+// A description as text: corners as they were, intervals through the per-pixel form of the records.
+std::string describe(const RPFBoundaryRectangle_t& r) {
+    char text[512];
+    std::snprintf(text, sizeof text,
+                  "%s %s %s %c %s | %.17g %.17g %.17g %.17g %.17g %.17g %.17g %.17g | %.12g %.12g | %u x %u",
+                  r.productDataType, r.compressionRatio, r.scale, r.zone, r.producer, r.upperLeftLatitude,
+                  r.upperLeftLongitude, r.lowerLeftLatitude, r.lowerLeftLongitude, r.upperRightLatitude,
+                  r.upperRightLongitude, r.lowerRightLatitude, r.lowerRightLongitude, r.verticalInterval,
+                  r.horizontalInterval, r.verticalFrames, r.horizontalFrames);
+    std::string out = text;
+    for (int i = 0; i < r.frameCount; ++i)
+        out += std::string(" ") + (r.frameFiles[i] ? r.frameFiles[i] : "-");
+    return out;
 }
 
 void expectBoundaries(CRpfSource& toc, const RpfTestRectangles& rectangles) {
@@ -66,28 +58,12 @@ void expectBoundaries(CRpfSource& toc, const RpfTestRectangles& rectangles) {
     ASSERT_EQ(count, rectangles.size());
     for (size_t n = 0; n < count; ++n) {
         SCOPED_TRACE("rectangle " + std::to_string(n));
-        expectSameDescription(*boundaries[n], rectangles[n]->description);
+        EXPECT_EQ(describe(*boundaries[n]), describe(rectangles[n]->description));
     }
     CRpfSource::freeRpfBoundaries(boundaries);
 }
 
-void putBigEndian(std::string& bytes, size_t at, unsigned long long value, int width) {
-    for (int i = width - 1; i >= 0; --i, value >>= 8)
-        bytes[at + i] = static_cast<char>(value & 0xFF);
-}
-
 } // namespace
-
-TEST(RpfToc, GeographicLocationCodes) {
-    EXPECT_EQ(CRpfSource::getGeographicLocation(0, 0), "NGAA00");
-    EXPECT_EQ(CRpfSource::getGeographicLocation(-90, -180), "AAAA00");
-    // Whole degrees within the 15-degree cells, then tenths of a degree of longitude and latitude.
-    EXPECT_EQ(CRpfSource::getGeographicLocation(33.93, 1.99994), "NJBD99");
-    EXPECT_EQ(CRpfSource::getGeographicLocation(28.95, -99.25), "FHFP79");
-    EXPECT_EQ(CRpfSource::getGeographicLocation(-0.3, 0.3), "NFAQ37");
-    // 180 degrees east lies one past the last letter: its terminator.
-    EXPECT_EQ(CRpfSource::getGeographicLocation(0, 180)[0], '\0');
-}
 
 TEST(RpfToc, OneFrameTableHasThePublishedLayout) {
     // One rectangle of one frame beside the A.TOC: 292 bytes, each component where the format puts it.
@@ -229,14 +205,13 @@ TEST(RpfToc, DamagedTablesAreRefusedBeforeTheyAreFollowed) {
         {"a frame of a rectangle that does not exist", frames, 7, 2, "refers to boundary rectangle 7"},
         {"a row outside the grid", frames + 2, 3, 2, "outside the 3 x 2 frames"},
         {"a column outside the grid", frames + 4, 2, 2, "outside the 3 x 2 frames"},
-        {"a grid far larger than its frames", 110 + 124, 60000, 4, "far larger than their 6 frames"},
-    };
+        {"a grid far larger than its frames", 110 + 124, 60000, 4, "far larger than their 6 frames"}};
     for (const Case& c : cases) {
         SCOPED_TRACE(c.what);
         std::string bytes = good;
-        putBigEndian(bytes, c.at, c.value, c.width);
+        bytes.replace(c.at, c.width, bigEndian(c.value, c.width));
         if (std::string(c.what) == "a grid far larger than its frames")
-            putBigEndian(bytes, 110 + 128, 60000, 4);
+            bytes.replace(110 + 128, 4, bigEndian(60000, 4));
         const std::string message = readRaw(bytes);
         EXPECT_NE(message.find(c.message), std::string::npos) << message;
     }
@@ -252,7 +227,7 @@ TEST(RpfToc, TruncatedTablesNeverCrash) {
     EXPECT_EQ(refused, tried);
     // A pathname offset that matches no pathname record leaves that frame without a path.
     std::string bytes = good;
-    putBigEndian(bytes, 387 + 6, 5, 4);
+    bytes.replace(387 + 6, 4, bigEndian(5, 4));
     CRpfSource toc;
     ASSERT_EQ(readRaw(bytes, &toc), "");
     EXPECT_EQ(toc.getToc().frames[0].pathname, -1);

@@ -3,8 +3,6 @@
 // refusals.
 #include <gtest/gtest.h>
 
-#include <filesystem>
-#include <fstream>
 #include <string>
 
 #include "Manifest.h"
@@ -14,32 +12,22 @@
 namespace {
 
 using nlohmann::json;
-namespace fs = std::filesystem;
 
+// The tool's output; `status` receives its exit status.
 std::string toc(const std::string& arguments, int& status) {
-    return runCommand(std::string(NITF_TOOL_PATH) + " toc " + arguments + " 2>/dev/null", status);
+    std::string output;
+    status = runTool("toc " + arguments, &output);
+    return output;
 }
 
-// A scratch directory holding an A.TOC and some of its frames, removed with the object.
-class TocDirectory {
-public:
+// A scratch directory holding an A.TOC and some of its frames.
+struct TocDirectory : TempDir {
     explicit TocDirectory(const std::string& tocBytes) {
-        TempFile marker;
-        m_root = marker.path() + ".dir";
-        fs::create_directories(m_root + "/rpf/onc");
         write("A.TOC", tocBytes);
         // Names on disk in lower case; the table stores them in upper case.
         write("rpf/onc/001zc013.on1", "frame");
         write("001ALL26.I12", "frame");
     }
-    ~TocDirectory() { fs::remove_all(m_root); }
-    std::string path(const std::string& name) const { return m_root + "/" + name; }
-
-private:
-    void write(const std::string& name, const std::string& bytes) const {
-        std::ofstream(path(name), std::ios::binary) << bytes;
-    }
-    std::string m_root;
 };
 
 void expectKnownRectangles(const json& report, const TocDirectory& directory) {
@@ -54,7 +42,7 @@ void expectKnownRectangles(const json& report, const TocDirectory& directory) {
     EXPECT_EQ(frames[0].at("row"), 2);
     EXPECT_EQ(frames[0].at("column"), 0);
     EXPECT_TRUE(frames[0].at("exists").get<bool>());
-    EXPECT_EQ(frames[0].at("file"), directory.path("rpf/onc/001zc013.on1"));
+    EXPECT_EQ(frames[0].at("file"), directory.file("rpf/onc/001zc013.on1"));
     EXPECT_FALSE(frames[1].at("exists").get<bool>());
     EXPECT_TRUE(frames[1].at("file").is_null());
     const json& second = report["rectangles"][1];
@@ -73,13 +61,13 @@ TEST(TocCommand, RawAndNitfWrappedTablesListTheirFrames) {
         SCOPED_TRACE(raw ? "raw" : "NITF-wrapped");
         TocDirectory directory(bytes);
         int status = 0;
-        const json report = json::parse(toc("--json '" + directory.path("A.TOC") + "'", status));
+        const json report = json::parse(toc("--json '" + directory.file("A.TOC") + "'", status));
         EXPECT_EQ(status, 0);
         EXPECT_EQ(report.at("form"), raw ? "raw" : "NITF-wrapped");
         EXPECT_EQ(report.at("header").at("fileName"), "A.TOC");
         expectKnownRectangles(report, directory);
 
-        const std::string text = toc("'" + directory.path("A.TOC") + "'", status);
+        const std::string text = toc("'" + directory.file("A.TOC") + "'", status);
         EXPECT_EQ(status, 0);
         EXPECT_NE(text.find("rectangle 0: CADRG 55:1 scale 1:1,000,000, zone 1"), std::string::npos) << text;
         EXPECT_NE(text.find("./RPF/TPC/001ZE013.ON1  (missing)"), std::string::npos) << text;
@@ -88,8 +76,7 @@ TEST(TocCommand, RawAndNitfWrappedTablesListTheirFrames) {
 }
 
 TEST(TocCommand, FrameFilesAreDescribed) {
-    if (corpusRoot().empty())
-        GTEST_SKIP() << "no test corpus";
+    SKIP_WITHOUT_CORPUS();
     int status = 0;
     const json report = json::parse(toc("--json '" + corpusRoot() + "/rpf/001zc013.on1'", status));
     EXPECT_EQ(status, 0);
@@ -99,11 +86,6 @@ TEST(TocCommand, FrameFilesAreDescribed) {
     EXPECT_EQ(frame.at("colours").size(), 216u);
     EXPECT_EQ(frame.at("transparentCode"), 216);
     EXPECT_NEAR(frame.at("coverage").at("corners").at("upperLeft").at(0).get<double>(), 31.034482759, 1e-9);
-
-    const std::string text = toc("'" + corpusRoot() + "/rpf/0000M033.GN3'", status);
-    EXPECT_EQ(status, 0);
-    EXPECT_NE(text.find("RPF frame 0000M033.GN3"), std::string::npos) << text;
-    EXPECT_NE(text.find("transparent code 216"), std::string::npos) << text;
 }
 
 TEST(TocCommand, OtherFilesAreRefused) {
@@ -114,11 +96,11 @@ TEST(TocCommand, OtherFilesAreRefused) {
     toc("/nonexistent/A.TOC", status);
     EXPECT_NE(status, 0);
     toc("", status);
-    EXPECT_EQ(WEXITSTATUS(status), 2);
+    EXPECT_EQ(status, 2);
     // A damaged table: a count beyond the file.
     std::string bytes = rawRpfToc(knownRpfRectangles());
     bytes[102 + 4] = '\x7F';
     TempFile damaged(bytes, ".TOC");
     toc("'" + damaged.path() + "'", status);
-    EXPECT_EQ(WEXITSTATUS(status), 1);
+    EXPECT_EQ(status, 1);
 }

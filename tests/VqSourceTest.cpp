@@ -6,68 +6,20 @@
 
 #include <algorithm>
 #include <cstdint>
-#include <memory>
 #include <string>
 #include <vector>
 
 #include "HostError.h"
 #include "NitfFileReader.h"
 #include "NitfImageSourceVQ.h"
-#include "NitfSampleWriter.h"
-#include "TestFiles.h"
+#include "NitfTestFile.h"
 #include "VqDecoder.h"
+#include "VqStreams.h"
+#include "WalkFile.h"
+
+using vqtest::Layout;
 
 namespace {
-
-// The code grid of a block and how the image data describe it.
-struct Layout {
-    int codesPerRow = 8;
-    int codeRows = 8;
-    int bits = 12;
-    int kernelWidth = 4;
-    int kernelHeight = 4;
-    bool withGrid = true; // the header starts with the code grid (the image display parameters)
-    int blockWidth() const { return codesPerRow * kernelWidth; }
-    int blockHeight() const { return codeRows * kernelHeight; }
-    size_t indexBytes() const { return static_cast<size_t>(codesPerRow) * codeRows * bits / 8; }
-};
-
-void putBigEndian(std::string& out, uint64_t value, int bytes) {
-    for (int i = bytes - 1; i >= 0; --i)
-        out += static_cast<char>((value >> (8 * i)) & 0xFF);
-}
-
-// The pixels of kernel `code` of the tests' codebook.
-unsigned char kernelPixel(int code, int row, int col) {
-    return static_cast<unsigned char>(code * 13 + (code >> 8) + row * 5 + col * 3);
-}
-
-// The header and the codebook: kernel-height tables of 2^bits records of kernel-width bytes.
-std::string headerAndCodebook(const Layout& layout, int lookupRecords = 4) {
-    std::string out;
-    if (layout.withGrid) {
-        putBigEndian(out, layout.codeRows, 4);
-        putBigEndian(out, layout.codesPerRow, 4);
-        putBigEndian(out, layout.bits, 1);
-    }
-    putBigEndian(out, 1, 2); // vector quantisation
-    putBigEndian(out, lookupRecords, 2);
-    putBigEndian(out, 0, 2);
-    putBigEndian(out, 6, 4);
-    putBigEndian(out, 14, 2);
-    for (int id = 1; id <= lookupRecords; ++id) {
-        putBigEndian(out, id, 2);
-        putBigEndian(out, 1u << layout.bits, 4);
-        putBigEndian(out, layout.kernelWidth, 2);
-        putBigEndian(out, 8, 2);
-        putBigEndian(out, 0, 4); // never followed
-    }
-    for (int row = 0; row < layout.kernelHeight; ++row)
-        for (int code = 0; code < (1 << layout.bits); ++code)
-            for (int col = 0; col < layout.kernelWidth; ++col)
-                out += static_cast<char>(kernelPixel(code, row, col));
-    return out;
-}
 
 // The codes of block entry `entry`, varied from block to block.
 std::vector<int> codesOf(const Layout& layout, int entry) {
@@ -82,18 +34,6 @@ std::vector<int> codesOf(const Layout& layout, int entry) {
     return codes;
 }
 
-// The codes packed most significant bit first, cut to the block's whole index bytes.
-std::string packed(const Layout& layout, const std::vector<int>& codes) {
-    std::string bytes((codes.size() * layout.bits + 7) / 8, '\0');
-    size_t bit = 0;
-    for (int code : codes)
-        for (int i = layout.bits - 1; i >= 0; --i, ++bit)
-            if ((code >> i) & 1)
-                bytes[bit / 8] = static_cast<char>(bytes[bit / 8] | (0x80 >> (bit % 8)));
-    bytes.resize(layout.indexBytes());
-    return bytes;
-}
-
 // The pixels a block of these codes decodes to, rows of block width.
 std::vector<unsigned char> expectedBlock(const Layout& layout, int entry) {
     const std::vector<int> codes = codesOf(layout, entry);
@@ -103,7 +43,7 @@ std::vector<unsigned char> expectedBlock(const Layout& layout, int entry) {
             const int code = codes[static_cast<size_t>(y / layout.kernelHeight) * layout.codesPerRow +
                                    x / layout.kernelWidth];
             pixels[static_cast<size_t>(y) * layout.blockWidth() + x] =
-                kernelPixel(code, y % layout.kernelHeight, x % layout.kernelWidth);
+                vqtest::kernelPixel(code, y % layout.kernelHeight, x % layout.kernelWidth);
         }
     return pixels;
 }
@@ -120,80 +60,49 @@ nitfsample::Image vqImage(const Layout& layout, int blocksX, int blocksY, int ba
     image.nppbv = layout.blockHeight();
     image.cols = blocksX * image.nppbh;
     image.rows = blocksY * image.nppbv;
-    std::string data = headerAndCodebook(layout);
+    std::string data = vqtest::headerAndCodebook(layout);
     for (int entry = 0; entry < blocksX * blocksY * bands; ++entry)
-        data += packed(layout, codesOf(layout, entry));
+        data += vqtest::packed(layout, codesOf(layout, entry));
     image.blockData = {data};
     return image;
 }
 
-std::string fileWith(const nitfsample::Image& image) {
-    nitfsample::File file;
-    file.images = {image};
-    return nitfsample::build(file);
+// Block (x, y) of a band, as many bytes as the source asks for, 0xEE beyond what it writes.
+std::vector<unsigned char> blockOf(OpenedSample& image, int x, int y, int band = 0, bool* present = nullptr) {
+    const CNitfImagePropertiesIF& p = image.source().getImageProperties();
+    std::vector<unsigned char> pixels(static_cast<size_t>(p.getTileBandReadBufferSize()), 0xEE);
+    const bool read = image.source().readTileNonInterleaved(
+        &image.reader(), reinterpret_cast<char*>(pixels.data()), p.getTileWidth(), x, y, band);
+    if (present)
+        *present = read;
+    return pixels;
 }
 
-struct OpenImage {
-    explicit OpenImage(const std::string& bytes) : file(bytes) {
-        if (!reader.open(file.path().c_str()))
-            throw std::runtime_error("cannot open");
-        source.reset(reader.getNewImageSource(0));
-    }
-    std::vector<unsigned char> block(int x, int y, int band = 0, bool* present = nullptr) {
-        const CNitfImagePropertiesIF& p = source->getImageProperties();
-        std::vector<unsigned char> pixels(static_cast<size_t>(p.getTileBandReadBufferSize()), 0xEE);
-        const bool read = source->readTileNonInterleaved(&reader, reinterpret_cast<char*>(pixels.data()),
-                                                         p.getTileWidth(), x, y, band);
-        if (present)
-            *present = read;
-        return pixels;
-    }
-    TempFile file;
-    CNitfFileReader reader;
-    std::unique_ptr<CNitfImageSource> source;
-};
-
-// Opens image 0 and reads every block band; the exception's message, or "" when all went through.
-std::string readEverything(const std::string& bytes) {
-    try {
-        OpenImage image(bytes);
-        const CNitfImagePropertiesIF& p = image.source->getImageProperties();
-        for (int band = 0; band < p.getBandCount(); ++band)
-            for (int y = 0; y < p.getTileCountY(); ++y)
-                for (int x = 0; x < p.getTileCountX(); ++x)
-                    image.block(x, y, band);
-    } catch (const vexo::Exception& e) {
-        return e.what();
-    }
-    return "";
+// Image 0 read as a careful application reads it: the message of its refusal, or "".
+std::string readEverything(const nitfsample::Image& vq) {
+    OpenedSample file(vq);
+    return readImage(file.reader(), 0);
 }
 
 } // namespace
 
 TEST(VqDecoder, EveryCodeLengthAndKernelSizeDecodesItsKernels) {
-    struct Case {
-        int codesPerRow, codeRows, bits, kernelWidth, kernelHeight;
-    };
-    // 4 x 4 kernels with whole vectors of four codes and a remainder; other code lengths and kernel sizes.
-    const Case cases[] = {{8, 8, 12, 4, 4}, {6, 3, 12, 4, 4}, {8, 2, 5, 2, 3}, {7, 2, 8, 1, 1},
-                          {4, 4, 16, 2, 2}, {8, 1, 1, 8, 8},  {4, 2, 3, 4, 4}};
-    for (const Case& c : cases) {
-        Layout layout;
-        layout.codesPerRow = c.codesPerRow;
-        layout.codeRows = c.codeRows;
-        layout.bits = c.bits;
-        layout.kernelWidth = c.kernelWidth;
-        layout.kernelHeight = c.kernelHeight;
-        SCOPED_TRACE(std::to_string(c.bits) + "-bit codes, " + std::to_string(c.codesPerRow) + " x " +
-                     std::to_string(c.codeRows) + " of " + std::to_string(c.kernelWidth) + " x " +
-                     std::to_string(c.kernelHeight));
-        CVqDecoder decoder(c.codesPerRow, c.codeRows, c.bits, c.kernelWidth, c.kernelHeight);
+    // Codes per row and rows, code length, kernel width and height: 4 x 4 kernels with whole vectors of four
+    // codes and a remainder; other code lengths and kernel sizes.
+    const Layout layouts[] = {{8, 8, 12, 4, 4}, {6, 3, 12, 4, 4}, {8, 2, 5, 2, 3}, {7, 2, 8, 1, 1},
+                              {4, 4, 16, 2, 2}, {8, 1, 1, 8, 8},  {4, 2, 3, 4, 4}};
+    for (const Layout& layout : layouts) {
+        SCOPED_TRACE(std::to_string(layout.bits) + "-bit codes, " + std::to_string(layout.codesPerRow) +
+                     " x " + std::to_string(layout.codeRows) + " of " + std::to_string(layout.kernelWidth) +
+                     " x " + std::to_string(layout.kernelHeight));
+        CVqDecoder decoder(layout.codesPerRow, layout.codeRows, layout.bits, layout.kernelWidth,
+                           layout.kernelHeight);
         ASSERT_EQ(decoder.indexBytes(), layout.indexBytes());
-        std::string book = headerAndCodebook(layout);
+        std::string book = vqtest::headerAndCodebook(layout);
         book.erase(0, book.size() - decoder.codebookBytes());
         decoder.setCodebook(reinterpret_cast<const unsigned char*>(book.data()));
         std::string indexes =
-            packed(layout, codesOf(layout, 3)) + std::string(CVqDecoder::kIndexPadding, '\0');
+            vqtest::packed(layout, codesOf(layout, 3)) + std::string(CVqDecoder::kIndexPadding, '\0');
         // Lines wider than the block: what lies right of it stays as it was.
         const int line = layout.blockWidth() + 5;
         std::vector<unsigned char> out(static_cast<size_t>(line) * layout.blockHeight(), 0xEE);
@@ -209,19 +118,12 @@ TEST(VqDecoder, EveryCodeLengthAndKernelSizeDecodesItsKernels) {
 }
 
 TEST(VqSource, BlocksDecodeWithAndWithoutTheCodeGrid) {
-    Layout withGrid;
-    Layout withoutGrid; // only the CADRG grid can do without: 64 x 64 codes of 12 bits
-    withoutGrid.codesPerRow = withoutGrid.codeRows = 64;
-    withoutGrid.withGrid = false;
-    Layout eightBit; // another code length, read bit by bit
-    eightBit.bits = 8;
-    eightBit.kernelWidth = 2;
-    eightBit.kernelHeight = 3;
-    for (const Layout& layout : {withGrid, withoutGrid, eightBit}) {
+    // Only the CADRG grid, 64 x 64 codes of 12 bits, can do without; another code length is read bit by bit.
+    const Layout layouts[] = {{8, 8, 12, 4, 4, true}, {64, 64, 12, 4, 4, false}, {8, 8, 8, 2, 3, true}};
+    for (const Layout& layout : layouts) {
         SCOPED_TRACE(std::to_string(layout.bits) + " bits, grid " + (layout.withGrid ? "given" : "implied"));
-        OpenImage image(fileWith(vqImage(layout, 2, 2)));
-        auto* vq = dynamic_cast<CNitfImageSourceVQ*>(image.source.get());
-        ASSERT_NE(vq, nullptr);
+        OpenedSample image(vqImage(layout, 2, 2));
+        auto* vq = &image.source<CNitfImageSourceVQ>();
         EXPECT_EQ(vq->getCodeBitLength(), layout.bits);
         EXPECT_EQ(vq->getCodesPerRow(), layout.codesPerRow);
         EXPECT_EQ(vq->getKernelWidth(), layout.kernelWidth);
@@ -229,16 +131,16 @@ TEST(VqSource, BlocksDecodeWithAndWithoutTheCodeGrid) {
         EXPECT_EQ(vq->getIndexBytesPerBlock(), static_cast<int>(layout.indexBytes()));
         for (int entry = 0; entry < 4; ++entry) {
             bool present = false;
-            std::vector<unsigned char> pixels = image.block(entry % 2, entry / 2, 0, &present);
+            std::vector<unsigned char> pixels = blockOf(image, entry % 2, entry / 2, 0, &present);
             EXPECT_TRUE(present);
             pixels.resize(static_cast<size_t>(layout.blockWidth()) * layout.blockHeight());
             EXPECT_EQ(pixels, expectedBlock(layout, entry)) << "block " << entry;
         }
         // Outside the image: nothing read.
         bool present = true;
-        image.block(2, 0, 0, &present);
+        blockOf(image, 2, 0, 0, &present);
         EXPECT_FALSE(present);
-        image.block(0, 0, 1, &present);
+        blockOf(image, 0, 0, 1, &present);
         EXPECT_FALSE(present);
     }
 }
@@ -248,19 +150,19 @@ TEST(VqSource, TwoBandsBandSequentialAndByBlock) {
     const size_t blockPixels = static_cast<size_t>(layout.blockWidth()) * layout.blockHeight();
     for (char imode : {'S', 'B'}) {
         SCOPED_TRACE(std::string("IMODE ") + imode);
-        OpenImage image(fileWith(vqImage(layout, 2, 1, 2, imode)));
+        OpenedSample image(vqImage(layout, 2, 1, 2, imode));
         // Entries in file order: S holds band 0's blocks then band 1's; B holds each block's bands together.
         auto entryOf = [&](int x, int band) { return imode == 'S' ? band * 2 + x : x * 2 + band; };
         for (int x = 0; x < 2; ++x)
             for (int band = 0; band < 2; ++band) {
-                std::vector<unsigned char> pixels = image.block(x, 0, band);
+                std::vector<unsigned char> pixels = blockOf(image, x, 0, band);
                 pixels.resize(blockPixels);
                 EXPECT_EQ(pixels, expectedBlock(layout, entryOf(x, band))) << x << "," << band;
             }
         // Both bands at once, pixel-interleaved.
         std::vector<char> both(2 * blockPixels);
         ASSERT_TRUE(
-            image.source->readTileInterleaved(&image.reader, both.data(), 2 * layout.blockWidth(), 1, 0));
+            image.source().readTileInterleaved(&image.reader(), both.data(), 2 * layout.blockWidth(), 1, 0));
         const std::vector<unsigned char> band0 = expectedBlock(layout, entryOf(1, 0));
         const std::vector<unsigned char> band1 = expectedBlock(layout, entryOf(1, 1));
         for (size_t i = 0; i < blockPixels; ++i) {
@@ -268,25 +170,6 @@ TEST(VqSource, TwoBandsBandSequentialAndByBlock) {
             ASSERT_EQ(static_cast<unsigned char>(both[2 * i + 1]), band1[i]) << i;
         }
     }
-}
-
-TEST(VqSource, StorageLengthsOfTheWrittenForm) {
-    nitfsample::Image frame;
-    frame.ic = "C4";
-    frame.comrat = "0.75";
-    frame.rows = frame.cols = 1536;
-    frame.nppbh = frame.nppbv = 256;
-    frame.blockData = {std::string(100, '\0')};
-    TempFile file(fileWith(frame));
-    CNitfFileReader reader;
-    ASSERT_TRUE(reader.open(file.path().c_str()));
-    CNitfImageSourceVQ source(reader.getFileHeader()->getNewImageSubheader(reader.getInputStream(), 0),
-                              nullptr);
-    EXPECT_EQ(source.computeVqIndexesPerTileLength(), 6144);
-    EXPECT_EQ(source.computeVqIndexesLength(), 36 * 6144);
-    EXPECT_EQ(source.computeStorageLength(), 36 * 6144 + 65613);
-    EXPECT_EQ(CNitfImageSourceVQ::computeVqHeaderLength() + CNitfImageSourceVQ::computeVqCodebookLength(),
-              65613);
 }
 
 TEST(VqSource, DamagedHeadersAreRefusedWithAClearMessage) {
@@ -305,28 +188,26 @@ TEST(VqSource, DamagedHeadersAreRefusedWithAClearMessage) {
         {"more codes per row than pixels", 4, std::string("\0\0\x01\0", 4), "no usable code grid"},
         {"more code rows than lines", 0, std::string("\x7F\xFF\xFF\xFF", 4), "no usable code grid"},
         {"a lookup table offset far away", 15, std::string("\xFF\xFF\xFF\x00", 4), "The VQ codebook"},
-        {"65535 lookup records", 11, std::string("\xFF\xFF", 2), "The VQ codebook"},
-    };
+        {"65535 lookup records", 11, std::string("\xFF\xFF", 2), "The VQ codebook"}};
     for (const Case& c : cases) {
         SCOPED_TRACE(c.what);
         nitfsample::Image image = good;
         image.blockData[0].replace(c.at, c.bytes.size(), c.bytes);
-        EXPECT_NE(readEverything(fileWith(image)).find(c.message), std::string::npos)
-            << readEverything(fileWith(image));
+        EXPECT_NE(readEverything(image).find(c.message), std::string::npos) << readEverything(image);
     }
     // A codebook cut short, and the indexes of a block that cannot be in the file.
     nitfsample::Image cut = good;
     cut.blockData[0] = data.substr(0, 77 + 1000);
-    EXPECT_NE(readEverything(fileWith(cut)).find("The VQ codebook"), std::string::npos);
+    EXPECT_NE(readEverything(cut).find("The VQ codebook"), std::string::npos);
     cut.blockData[0] = data.substr(0, 77 + 65536 + 10);
-    EXPECT_NE(readEverything(fileWith(cut)).find("The indexes of a VQ block"), std::string::npos);
+    EXPECT_NE(readEverything(cut).find("The indexes of a VQ block"), std::string::npos);
     // Several bands interleaved by pixel: each kernel holds one band's pixels.
     nitfsample::Image pixelInterleaved = vqImage(layout, 1, 1, 3, 'P');
-    EXPECT_NE(readEverything(fileWith(pixelInterleaved)).find("must have one band"), std::string::npos);
+    EXPECT_NE(readEverything(pixelInterleaved).find("must have one band"), std::string::npos);
     // Caller's rows too short for the block.
-    OpenImage image(fileWith(good));
+    OpenedSample image(good);
     std::vector<char> pixels(4096);
-    EXPECT_THROW(
-        image.source->readTileNonInterleaved(&image.reader, pixels.data(), layout.blockWidth() - 1, 0, 0, 0),
-        vexo::Exception);
+    EXPECT_THROW(image.source().readTileNonInterleaved(&image.reader(), pixels.data(),
+                                                       layout.blockWidth() - 1, 0, 0, 0),
+                 vexo::Exception);
 }

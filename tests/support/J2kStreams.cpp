@@ -6,6 +6,8 @@
 
 #include <openjpeg.h>
 
+#include "TestFiles.h"
+
 namespace j2ktest {
 
 namespace {
@@ -17,31 +19,6 @@ std::pair<int, int> samplingOf(const Coding& coding, int component) {
 
 int ceilDiv(int a, int b) {
     return (a + b - 1) / b;
-}
-
-struct Sink {
-    std::string bytes;
-    size_t position = 0;
-};
-
-OPJ_SIZE_T writeBytes(void* buffer, OPJ_SIZE_T size, void* user) {
-    Sink* sink = static_cast<Sink*>(user);
-    if (sink->bytes.size() < sink->position + size)
-        sink->bytes.resize(sink->position + size);
-    std::memcpy(&sink->bytes[sink->position], buffer, size);
-    sink->position += size;
-    return size;
-}
-
-OPJ_OFF_T skipBytes(OPJ_OFF_T count, void* user) {
-    Sink* sink = static_cast<Sink*>(user);
-    sink->position += static_cast<size_t>(count);
-    return count;
-}
-
-OPJ_BOOL seekBytes(OPJ_OFF_T position, void* user) {
-    static_cast<Sink*>(user)->position = static_cast<size_t>(position);
-    return OPJ_TRUE;
 }
 
 } // namespace
@@ -113,13 +90,10 @@ std::string encode(const Coding& coding, const Samples& samples) {
         p.cp_ty0 = coding.tileY0;
     }
 
-    Sink sink;
+    // Through a scratch file: OpenJPEG's own file streams.
+    TempFile file("", ".j2k");
     opj_codec_t* codec = opj_create_compress(OPJ_CODEC_J2K);
-    opj_stream_t* stream = opj_stream_create(1 << 20, OPJ_FALSE);
-    opj_stream_set_user_data(stream, &sink, nullptr);
-    opj_stream_set_write_function(stream, writeBytes);
-    opj_stream_set_skip_function(stream, skipBytes);
-    opj_stream_set_seek_function(stream, seekBytes);
+    opj_stream_t* stream = opj_stream_create_default_file_stream(file.path().c_str(), OPJ_FALSE);
     const bool ok = opj_setup_encoder(codec, &p, image) && opj_start_compress(codec, image, stream) &&
                     opj_encode(codec, stream) && opj_end_compress(codec, stream);
     opj_stream_destroy(stream);
@@ -127,51 +101,12 @@ std::string encode(const Coding& coding, const Samples& samples) {
     opj_image_destroy(image);
     if (!ok)
         throw std::runtime_error("JPEG 2000 encoding failed");
-    return sink.bytes;
+    return file.read();
 }
-
-} // namespace j2ktest
-
-namespace j2ktest {
-
-namespace {
-
-struct Source {
-    const std::string* bytes;
-    size_t position = 0;
-};
-
-OPJ_SIZE_T readBytes(void* buffer, OPJ_SIZE_T size, void* user) {
-    Source* source = static_cast<Source*>(user);
-    const size_t count = std::min(size, source->bytes->size() - source->position);
-    if (count == 0)
-        return static_cast<OPJ_SIZE_T>(-1);
-    std::memcpy(buffer, source->bytes->data() + source->position, count);
-    source->position += count;
-    return count;
-}
-
-OPJ_OFF_T skipSource(OPJ_OFF_T count, void* user) {
-    Source* source = static_cast<Source*>(user);
-    source->position = std::min(source->bytes->size(), source->position + static_cast<size_t>(count));
-    return count;
-}
-
-OPJ_BOOL seekSource(OPJ_OFF_T position, void* user) {
-    static_cast<Source*>(user)->position = static_cast<size_t>(position);
-    return OPJ_TRUE;
-}
-
-} // namespace
 
 Decoded decodeWhole(const std::string& codestream, int level) {
-    Source source{&codestream};
-    opj_stream_t* stream = opj_stream_create(1 << 20, OPJ_TRUE);
-    opj_stream_set_user_data(stream, &source, nullptr);
-    opj_stream_set_user_data_length(stream, codestream.size());
-    opj_stream_set_read_function(stream, readBytes);
-    opj_stream_set_skip_function(stream, skipSource);
-    opj_stream_set_seek_function(stream, seekSource);
+    TempFile file(codestream, ".j2k");
+    opj_stream_t* stream = opj_stream_create_default_file_stream(file.path().c_str(), OPJ_TRUE);
     opj_codec_t* codec = opj_create_decompress(OPJ_CODEC_J2K);
     opj_dparameters_t parameters;
     opj_set_default_decoder_parameters(&parameters);

@@ -25,3 +25,8 @@ private:
     nlohmann::json m_document;
     std::vector<CorpusFile> m_files;
 };
+
+// In a test: skips it when there is no corpus.
+#define SKIP_WITHOUT_CORPUS()                                                                                \
+    if (Manifest::get().empty())                                                                             \
+    GTEST_SKIP() << "no test corpus"

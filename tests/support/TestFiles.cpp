@@ -2,10 +2,12 @@
 
 #include <cstdio>
 #include <cstdlib>
+#include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <stdexcept>
 #include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include "HostFile.h"
@@ -41,6 +43,23 @@ std::string TempFile::read() const {
     return readWholeFile(m_path);
 }
 
+TempDir::TempDir() {
+    std::string pattern = (std::filesystem::temp_directory_path() / "nitf-test-XXXXXX").string();
+    if (!mkdtemp(&pattern[0]))
+        throw std::runtime_error("cannot create a temporary directory");
+    m_path = pattern;
+}
+
+TempDir::~TempDir() {
+    std::error_code ignored;
+    std::filesystem::remove_all(m_path, ignored);
+}
+
+void TempDir::write(const std::string& name, const std::string& contents) const {
+    std::filesystem::create_directories(std::filesystem::path(file(name)).parent_path());
+    std::ofstream(file(name), std::ios::binary) << contents;
+}
+
 ByteStream::ByteStream(const std::string& bytes) : m_file(bytes, ".bin") {
     m_fp = DKOpen(m_file.path().c_str(), DK_READ | DK_WRITE | DK_BINARY | DK_EXISTING, "r+b");
     if (!m_fp)
@@ -49,6 +68,11 @@ ByteStream::ByteStream(const std::string& bytes) : m_file(bytes, ".bin") {
 
 ByteStream::~ByteStream() {
     DKClose(m_fp);
+}
+
+std::string ByteStream::contents() const {
+    std::fflush(m_fp);
+    return m_file.read();
 }
 
 std::string corpusRoot() {
@@ -66,14 +90,44 @@ std::string readWholeFile(const std::string& path) {
     return contents.str();
 }
 
-std::string runCommand(const std::string& command, int& status) {
+int runTool(const std::string& arguments, std::string* output) {
+    const std::string command = std::string(NITF_TOOL_PATH) + " 2>/dev/null " + arguments;
     FILE* pipe = popen(command.c_str(), "r");
     if (!pipe)
         throw std::runtime_error("cannot run " + command);
-    std::string output;
+    std::string text;
     char buffer[65536];
     for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, pipe)) > 0;)
-        output.append(buffer, got);
-    status = pclose(pipe);
-    return output;
+        text.append(buffer, got);
+    const int status = pclose(pipe);
+    if (output)
+        *output = text;
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+bool haveCommand(const std::string& name) {
+    return std::system(("command -v " + name + " >/dev/null 2>&1").c_str()) == 0;
+}
+
+CapturedWarnings::CapturedWarnings() {
+    m_previous = vexo::nspio::Warning::setHandler(
+        [this](const char* message, const char*, int) { m_messages.push_back(message); });
+}
+
+CapturedWarnings::~CapturedWarnings() {
+    vexo::nspio::Warning::setHandler(m_previous);
+}
+
+int CapturedWarnings::count(const std::string& part) const {
+    int n = 0;
+    for (const std::string& message : m_messages)
+        n += message.find(part) != std::string::npos;
+    return n;
+}
+
+std::string joined(std::initializer_list<std::string> fields) {
+    std::string out;
+    for (const std::string& field : fields)
+        out += field;
+    return out;
 }

@@ -12,6 +12,7 @@
 #include "NitfLabelSource.h"
 #include "NitfLutSource.h"
 #include "NitfRegionReader.h"
+#include "NitfSampleWriter.h"
 #include "NitfSymbolSource.h"
 #include "NitfTextSource.h"
 
@@ -22,7 +23,7 @@ const long long kLargestBuffer = 64LL << 20;
 // Enough block reads to reach every code path without making a single input slow.
 const int kBlockReads = 4096;
 
-void readImage(CNitfFileReader& reader, int index) {
+void readImageOf(CNitfFileReader& reader, int index) {
     std::unique_ptr<CNitfImageSource> source(reader.getNewImageSource(index));
     const CNitfImagePropertiesIF& p = source->getImageProperties();
     const long long height = std::max(p.getTileHeight(), 0);
@@ -57,6 +58,15 @@ void readImage(CNitfFileReader& reader, int index) {
         region.setBigEndian(true);
         region.read(0, region.getHeight() - rows, width, rows, {}, samples.data(),
                     CNitfRegionReader::ePixelInterleaved);
+    }
+    if (region.getResolutionLevels() > 1) {
+        region.setLevel(std::min(2, region.getResolutionLevels() - 1));
+        const int w = std::min(region.getWidth(), 64), h = std::min(region.getHeight(), 64);
+        if (w > 0 && h > 0 &&
+            region.getBufferSize(w, h, region.getBandCount()) <= static_cast<size_t>(kLargestBuffer)) {
+            std::vector<unsigned char> samples(region.getBufferSize(w, h, region.getBandCount()));
+            region.read(0, 0, w, h, {}, samples.data(), CNitfRegionReader::ePixelInterleaved);
+        }
     }
     for (int i = 0; i < source->getLutCount(); ++i) {
         CNitfLutSource* lut = source->getLutSource(i);
@@ -127,12 +137,35 @@ void walkBytes(const void* data, size_t size, std::string* refusal) {
     walkOpened([&](CNitfFileReader& reader) { return reader.openMemory(data, size) != nullptr; }, refusal);
 }
 
-void readEveryImage(CNitfFileReader& reader) {
-    for (int index = 0; index < std::min(reader.getImageCount(), 32); ++index) {
-        try {
-            readImage(reader, index);
-        } catch (const vexo::Exception&) {
-            // refused: fine
-        }
+std::string readImage(CNitfFileReader& reader, int index) {
+    try {
+        readImageOf(reader, index);
+    } catch (const vexo::Exception& e) {
+        return e.what();
     }
+    return "";
+}
+
+void readEveryImage(CNitfFileReader& reader) {
+    for (int index = 0; index < std::min(reader.getImageCount(), 32); ++index)
+        readImage(reader, index);
+}
+
+void readSample(const nitfsample::Image& image) {
+    nitfsample::File file;
+    file.images = {image};
+    std::string bytes;
+    try {
+        bytes = nitfsample::build(file);
+    } catch (const std::exception&) {
+        return; // a shape the writer cannot lay out
+    }
+    CNitfFileReader reader;
+    try {
+        if (!reader.openMemory(bytes.data(), bytes.size()))
+            return;
+    } catch (const vexo::Exception&) {
+        return;
+    }
+    readEveryImage(reader);
 }

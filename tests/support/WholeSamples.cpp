@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <cmath>
 #include <cstring>
-#include <fstream>
 #include <stdexcept>
 
 #include "NitfFile.h"
@@ -85,21 +84,6 @@ Stats statsOf(const std::vector<int32_t>& values) {
     s.mean = sum / values.size();
     s.stddev = std::sqrt(std::max(0.0, squares / values.size() - s.mean * s.mean));
     return s;
-}
-
-void writePicture(const Image& image, const std::string& path) {
-    const int channels = image.bands.size() >= 3 ? 3 : 1;
-    std::ofstream out(path, std::ios::binary);
-    out << (channels == 3 ? "P6" : "P5") << "\n" << image.cols << " " << image.rows << "\n255\n";
-    std::vector<Stats> stats;
-    for (int b = 0; b < channels; ++b)
-        stats.push_back(statsOf(image.bands[size_t(b)]));
-    for (size_t i = 0; i < size_t(image.rows) * image.cols; ++i)
-        for (int b = 0; b < channels; ++b) {
-            const Stats& s = stats[size_t(b)];
-            const double range = s.max > s.min ? s.max - s.min : 1;
-            out.put(static_cast<char>(std::lround((image.bands[size_t(b)][i] - s.min) * 255 / range)));
-        }
 }
 
 } // namespace wholesamples

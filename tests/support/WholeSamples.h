@@ -1,6 +1,5 @@
 // Whole images read block by block through an image source that delivers whole samples (every compressed
-// source but bi-level): values per band, their statistics, the canonical form the corpus manifest hashes, and
-// a picture to look at.
+// source but bi-level): values per band, their statistics, and the canonical form the corpus manifest hashes.
 #pragma once
 
 #include <cstdint>
@@ -29,8 +28,5 @@ struct Stats {
     double min = 0, max = 0, mean = 0, stddev = 0;
 };
 Stats statsOf(const std::vector<int32_t>& values);
-
-// A binary PGM (one band) or PPM (the first three bands), each band stretched to 0-255 from its own range.
-void writePicture(const Image& image, const std::string& path);
 
 } // namespace wholesamples
