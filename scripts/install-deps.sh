@@ -8,7 +8,7 @@ packages=(
     clang libclang-rt-14-dev nasm
     libgtest-dev libgmock-dev libbenchmark-dev
     libopenjp2-7-dev libopenjp2-tools libgeographiclib-dev libpng-dev libtiff-dev libgeotiff-dev zlib1g-dev
-    python3 nlohmann-json3-dev libssl-dev
+    python3 nlohmann-json3-dev
 )
 
 missing=()
