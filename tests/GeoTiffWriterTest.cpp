@@ -326,6 +326,24 @@ TEST(GeoTiffWriter, CloudOptimizedLayoutWithAveragedOverviews) {
     }
 }
 
+TEST(GeoTiffWriter, ThreadsWriteTheSameFile) {
+    RasterFormat format{700, 600, 3, SampleType::UInt16, true};
+    std::string first;
+    for (int threads : {1, 3}) {
+        SyntheticRaster raster(format, patternContent(SampleType::UInt16));
+        TiffOptions options;
+        options.cog = true;
+        options.tileSize = 128;
+        options.threads = threads;
+        TempFile file("", ".tif");
+        ASSERT_NO_THROW(writeGeoTiff(file.path(), raster, geographic(), options));
+        if (first.empty())
+            first = file.read();
+        else
+            EXPECT_TRUE(file.read() == first) << "the tiles land in the same order";
+    }
+}
+
 TEST(GeoTiffWriter, ReducedResolutionsComeFromTheSource) {
     // The source makes levels 1 and 2 itself (a different content, to tell them apart); level 3 is averaged
     // from its level 2.

@@ -183,6 +183,49 @@ TEST(ImageSourceMasked, PadPixelIsDecodedByPixelValueType) {
 // (The interleaving conversions are checked by every interleaved and band read above and by the region
 // reader's.)
 
+TEST(ImageSourceBitmap, RowsAreSampledAndAPadOfOneInvertsThem) {
+    Image image;
+    image.cols = 20;
+    image.rows = 10;
+    image.nppbh = 8;
+    image.nppbv = 4;
+    image.nbpp = 1;
+    image.pvtype = "B";
+    image.sample = [](int, int row, int col) {
+        return static_cast<uint64_t>((row * 3 + col * col) % 5 == 0);
+    };
+    auto bitAt = [](const std::vector<unsigned char>& bits, int index) {
+        return (bits[index / 8] >> (7 - index % 8)) & 1;
+    };
+    for (bool inverted : {false, true}) {
+        SCOPED_TRACE(inverted ? "pad pixel 1" : "no pad pixel");
+        if (inverted) {
+            image.ic = "NM";
+            image.padCodeBits = 8;
+            image.padValue = 1;
+            image.absentBlocks = {4}; // block (1, 1): rows 4-7, columns 8-15
+        }
+        OpenedSample open(image);
+        // Columns 3-15, 8 source rows onto 4 output rows (rows 1, 3, 5, 7), 16 bits per output row.
+        std::vector<unsigned char> out(8, 0x5A);
+        ASSERT_TRUE(open.source().readBitmap(reinterpret_cast<char*>(out.data()), 3, 1, 13, 8, 16, 4));
+        for (int i = 0; i < 4; ++i) {
+            const int row = 1 + 2 * i;
+            for (int c = 0; c < 16; ++c) {
+                int expected = 0;
+                if (c < 13 && !(inverted && row >= 4 && 3 + c >= 8))
+                    expected = static_cast<int>(nitfsample::sampleAt(image, 0, row, 3 + c));
+                EXPECT_EQ(bitAt(out, i * 16 + c), inverted ? 1 - expected : expected)
+                    << "row " << i << " bit " << c;
+            }
+        }
+        EXPECT_FALSE(open.source().readBitmap(reinterpret_cast<char*>(out.data()), 20, 0, 8, 4, 8, 4))
+            << "beyond the padded width";
+        EXPECT_FALSE(open.source().readBitmap(reinterpret_cast<char*>(out.data()), 0, 9, 8, 8, 8, 4))
+            << "rows beyond the image";
+    }
+}
+
 TEST(ImageSource, WriteabilityAndLowerCaseValueTypes) {
     Image image;
     image.imode = 'P';

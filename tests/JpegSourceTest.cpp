@@ -302,6 +302,27 @@ TEST(JpegResampling, StreamsOfAnotherSizeFitTheirBlock) {
     for (int y = 0; y < 32; ++y)
         for (int x = 0; x < 32; ++x)
             ASSERT_EQ(down[y * 32 + x], large.at(2 * x, 2 * y)) << x << ", " << y;
+
+    // Two-byte samples keep only their low byte, sign-extended, when columns are resampled: how these images
+    // have always been delivered.
+    const Raster deep = jpegtest::pattern(12, 16, 1, 12, 15);
+    OpenedSample narrowed(
+        jpegImage("C5", 16, 16, 16, 16, 1, 12, 'B', {jpegtest::encode(deep, lossless(12))}));
+    const std::vector<uint16_t> wide = bandOf(narrowed, 0, 0, 0);
+    const std::vector<int> columns = CBlockResampler::indexMap(16, 12);
+    ASSERT_EQ(wide.size(), 256u);
+    for (int y = 0; y < 16; ++y)
+        for (int x = 0; x < 16; ++x)
+            ASSERT_EQ(wide[y * 16 + x], uint16_t(int16_t(int8_t(deep.at(columns[x], y) & 0xFF))));
+
+    // A whole interleaved block is delivered as coded: the stream's rows at the block's row spacing, the rest
+    // of the buffer untouched.
+    std::vector<unsigned char> coded(128 * 128, 0xEE);
+    ASSERT_TRUE(enlarged.source().readTileInterleaved(&enlarged.reader(),
+                                                      reinterpret_cast<char*>(coded.data()), 128, 0, 0));
+    EXPECT_EQ(coded[95 * 128 + 95], small.at(95, 95));
+    EXPECT_EQ(coded[96], 0xEE);
+    EXPECT_EQ(coded[96 * 128], 0xEE);
 }
 
 // ---- amplitude mapping
