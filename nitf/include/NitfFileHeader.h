@@ -79,8 +79,7 @@ public:
 
     // Raises vexo::Exception when the sub-header of segment `index` of `kind` ("image", "graphic", ...) is
     // not wholly in the file: every field after the end would read as blanks.
-    static void requireSubheaderInFile(FILE* fp, const CNitfHeaderDataPair* pair, const char* kind,
-                                       int index);
+    void requireSubheaderInFile(const CNitfHeaderDataPair* pair, const char* kind, int index) const;
 
 protected:
     // Reads the user-defined and extended header data: UDHDL and XHDL, then the TREs of each area (the
@@ -119,6 +118,7 @@ protected:
     eNitfVersion_t m_version;
     bool m_propertiesModified;
     std::vector<NitfField_t> m_fields;
+    __int64 m_fileSize = -1; // of the file read, taken once when the header is read
 
 private:
     void seekToImageSubheader(FILE* fp, int index);
@@ -130,11 +130,12 @@ private:
 template <typename Subheader> CNitfImageSubheader* CNitfFileHeader::readImageSubheader(FILE* fp, int index) {
     if (!getImageHeaderDataPair(index))
         return nullptr;
-    requireSubheaderInFile(fp, getImageHeaderDataPair(index), "image", index);
+    requireSubheaderInFile(getImageHeaderDataPair(index), "image", index);
     seekToImageSubheader(fp, index);
     Subheader* subheader = new Subheader;
     try {
         subheader->read(fp, m_version);
+        subheader->warnOfRecordsPastTheEnd(m_fileSize);
     } catch (...) {
         delete subheader;
         throw;

@@ -78,6 +78,9 @@ public:
     // The number of bands: XBANDS when NBANDS is 0, else NBANDS.
     int getBandCount();
 
+    // Warns when a TRE or a look-up table reaches past `fileSize`, the end of the file read.
+    void warnOfRecordsPastTheEnd(__int64 fileSize);
+
 protected:
     bool hasTag(const char* name) { return CNitfTag::find(name, m_taggedRecords) != nullptr; }
     void clearContents();
@@ -88,8 +91,6 @@ protected:
     // Reads the sub-header with the layout of `version`, then what its fields point at: comments, look-up
     // tables, corners and TREs.
     void readWith(FILE* fp, eNitfVersion_t version);
-    // Warns when a TRE or a look-up table reaches past the end of the file.
-    void warnOfRecordsPastTheEnd(FILE* fp);
     // Writes the sub-header in this class's layout with the values that writing computes (see
     // writtenValues), and places the look-up table, the corners and the TREs; returns the bytes written.
     __int64 writeWithLayout(FILE* fp);

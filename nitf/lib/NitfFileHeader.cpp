@@ -158,13 +158,13 @@ void warn(const std::string& message) {
 
 } // namespace
 
-void CNitfFileHeader::requireSubheaderInFile(FILE* fp, const CNitfHeaderDataPair* pair, const char* kind,
-                                             int index) {
-    const __int64 size = DKSize(fp);
+void CNitfFileHeader::requireSubheaderInFile(const CNitfHeaderDataPair* pair, const char* kind,
+                                             int index) const {
+    const __int64 size = m_fileSize;
     if (!pair || size < 0 || pair->getHeaderEnd() <= size)
         return;
-    static const char signature[] = "void __cdecl CNitfFileHeader::requireSubheaderInFile(" NITF_FILE_SIG
-                                    ",const class CNitfHeaderDataPair *,const char *,int)";
+    static const char signature[] = "void __cdecl CNitfFileHeader::requireSubheaderInFile(const class "
+                                    "CNitfHeaderDataPair *,const char *,int)";
     if (pair->getHeaderOffset() >= size)
         NITF_RAISE_FORMAT(
             signature,
@@ -182,7 +182,7 @@ void CNitfFileHeader::checkHeaderLength(FILE* fp, __int64 fieldsEnd) {
     const std::string text = field ? field->toText() : std::string();
     const bool digits = !text.empty() && text.find_first_not_of("0123456789") == std::string::npos;
     const __int64 declared = digits ? field->getAsInt64() : 0;
-    const __int64 size = DKSize(fp);
+    const __int64 size = m_fileSize = DKSize(fp);
     const bool allNines = digits && text.find_first_not_of('9') == std::string::npos;
     if (digits && !allNines && declared >= fieldsEnd && (size < 0 || declared <= size))
         return;
@@ -196,7 +196,8 @@ void CNitfFileHeader::checkHeaderLength(FILE* fp, __int64 fieldsEnd) {
 }
 
 void CNitfFileHeader::checkSegmentsInFile(FILE* fp) {
-    const __int64 size = DKSize(fp);
+    m_fileSize = DKSize(fp);
+    const __int64 size = m_fileSize;
     if (size < 0)
         return;
     const struct {

@@ -111,8 +111,9 @@ namespace {
 // Builds a segment object for the pair at `index` and lets it read its sub-header; the caller owns the
 // result.
 template <typename Source, typename Read>
-Source* newSegment(FILE* fp, CNitfHeaderDataPair* pair, const char* kind, int index, Read read) {
-    CNitfFileHeader::requireSubheaderInFile(fp, pair, kind, index);
+Source* newSegment(const CNitfFileHeader& header, CNitfHeaderDataPair* pair, const char* kind, int index,
+                   Read read) {
+    header.requireSubheaderInFile(pair, kind, index);
     Source* source = new Source;
     try {
         source->prepare(pair);
@@ -132,7 +133,7 @@ CNitfSymbolSource* CNitfFileReader::getNewSymbolSource(int index) {
     if (!pair)
         NITF_RAISE("Invalid symbol index",
                    "class CNitfSymbolSource *__cdecl CNitfFileReader::getNewSymbolSource(int)");
-    return newSegment<CNitfSymbolSource>(m_fp, pair, "graphic", index, [&](CNitfSymbolSource& source) {
+    return newSegment<CNitfSymbolSource>(*m_header, pair, "graphic", index, [&](CNitfSymbolSource& source) {
         source.read(this, m_header->getVersion(), nullptr);
     });
 }
@@ -142,7 +143,7 @@ CNitfLabelSource* CNitfFileReader::getNewLabelSource(int index) {
     if (!pair)
         NITF_RAISE("Invalid label index",
                    "class CNitfLabelSource *__cdecl CNitfFileReader::getNewLabelSource(int)");
-    return newSegment<CNitfLabelSource>(m_fp, pair, "label", index, [&](CNitfLabelSource& source) {
+    return newSegment<CNitfLabelSource>(*m_header, pair, "label", index, [&](CNitfLabelSource& source) {
         source.read(this, m_header->getVersion(), nullptr);
     });
 }
@@ -152,7 +153,7 @@ CNitfTextSource* CNitfFileReader::getNewTextSource(int index) {
     if (!pair)
         NITF_RAISE("Invalid text index",
                    "class CNitfTextSource *__cdecl CNitfFileReader::getNewTextSource(int)");
-    return newSegment<CNitfTextSource>(m_fp, pair, "text", index, [&](CNitfTextSource& source) {
+    return newSegment<CNitfTextSource>(*m_header, pair, "text", index, [&](CNitfTextSource& source) {
         source.read(this, m_header->getVersion(), nullptr);
     });
 }
@@ -164,7 +165,7 @@ CNitfDataExtensionSource* CNitfFileReader::getNewDataExtensionSource(int index) 
         NITF_RAISE("Invalid data extension index",
                    "class CNitfDataExtensionSource *__cdecl CNitfFileReader::getNewDataExtensionSource(int)");
     return newSegment<CNitfDataExtensionSource>(
-        m_fp, pair, "data extension", index, [&](CNitfDataExtensionSource& source) {
+        *m_header, pair, "data extension", index, [&](CNitfDataExtensionSource& source) {
             source.read(this, m_header->getVersion(), nullptr, nullptr, nullptr);
         });
 }

@@ -251,14 +251,12 @@ void CNitfImageSubheader::readWith(FILE* fp, eNitfVersion_t version) {
     }
     // The overflow numbers are not kept: an overflow is resolved when its data extension segment is read.
     readTagAreas(places, {"UDID", "IXSHD"}, CNitfTag::eTagSourceImage, m_taggedRecords);
-    warnOfRecordsPastTheEnd(fp);
     m_propertiesModified = false;
 }
 
 // TREs and look-up tables whose lengths reach past the end of the file: what is missing reads as blanks or
 // zeros, and saying so is all that helps a reader of the file.
-void CNitfImageSubheader::warnOfRecordsPastTheEnd(FILE* fp) {
-    const __int64 size = DKSize(fp);
+void CNitfImageSubheader::warnOfRecordsPastTheEnd(__int64 size) {
     if (size < 0)
         return;
     for (CNitfTag* tag : m_taggedRecords) {

@@ -791,8 +791,10 @@ private:
         Level& level = m_levels[node.depth + 1];
         level.count = count; // as declared: band keys are padded to its width
         // Every repetition takes at least minWidth bytes: no more of them than the bytes left can feed (one
-        // more may start and come out short).
-        if (reading() && node.minWidth > 0)
+        // more may start and come out short). A count that cannot pass much is left to meet the end of the
+        // file as it reads: sizing the file costs a system call.
+        static const __int64 kUnsizedBytes = 1 << 20;
+        if (reading() && node.minWidth > 0 && count > kUnsizedBytes / node.minWidth)
             count = std::min(count, m_port.remaining() / node.minWidth + 1);
         level.bandKeys = (node.entry->flags & record::kBandKeys) != 0;
         for (__int64 n = 0; n < count && !m_stopped; ++n) {
