@@ -2,6 +2,8 @@
 
 #include <fstream>
 
+#include "HostError.h"
+#include "NitfFileReader.h"
 #include "TestFiles.h"
 
 const Manifest& Manifest::get() {
@@ -28,4 +30,12 @@ std::vector<CorpusFile> Manifest::wellFormed() const {
             files.push_back(file);
     }
     return files;
+}
+
+bool openCorpusFile(CNitfFileReader& reader, const CorpusFile& file) {
+    try {
+        return reader.open(file.path.c_str());
+    } catch (const vexo::Exception&) {
+        return false;
+    }
 }

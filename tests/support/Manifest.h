@@ -26,6 +26,12 @@ private:
     std::vector<CorpusFile> m_files;
 };
 
+class CNitfFileReader;
+
+// Opens a corpus file with `reader`; false when the reader does not take it (not a NITF file, or one it
+// refuses).
+bool openCorpusFile(CNitfFileReader& reader, const CorpusFile& file);
+
 // In a test: skips it when there is no corpus.
 #define SKIP_WITHOUT_CORPUS()                                                                                \
     if (Manifest::get().empty())                                                                             \
