@@ -7,7 +7,7 @@ build=${1:-build}
 work=${2:-${TMPDIR:-/tmp}/nitf-bench}
 nitf="$build/tools/nitf"
 mkdir -p "$work"
-[ -f "$work/jpeg-ycbcr-8192.ntf" ] || "$build/bench/nitf-bench-files" "$work"
+[ -f "$work/nc-bsq-8192.ntf" ] || "$build/bench/nitf-bench-files" "$work"
 command -v hyperfine >/dev/null || { echo "hyperfine is not installed (apt-get install hyperfine)"; exit 1; }
 gdal=()
 command -v gdal_translate >/dev/null && gdal=(1)
@@ -29,8 +29,13 @@ nc=("$nitf extract $work/nc-rgb-8192.ntf -f raw -o $work/out.raw -j 1"
 [ ${#gdal[@]} -gt 0 ] && nc+=("gdal_translate -q -of ENVI $work/nc-rgb-8192.ntf $work/gdal.raw")
 run "8192^2 RGB uncompressed (NC, IMODE B, 201 MB)" "${nc[@]}"
 
+bsq=("$nitf extract $work/nc-bsq-8192.ntf -f raw -o $work/out.raw"
+     "cp $work/nc-bsq-8192.ntf $work/copy.raw")
+[ ${#gdal[@]} -gt 0 ] && bsq+=("gdal_translate -q -of ENVI $work/nc-bsq-8192.ntf $work/gdal.raw")
+run "8192^2 RGB uncompressed, stored as the raw form (NC, IMODE S, one block column)" "${bsq[@]}"
+
 echo "== peak memory (KiB)"
-for f in jpeg-ycbcr-8192 nc-rgb-8192; do
+for f in jpeg-ycbcr-8192 nc-rgb-8192 nc-bsq-8192; do
     printf '%-20s ' "$f"
     /usr/bin/time -f %M "$nitf" extract "$work/$f.ntf" -f raw -o "$work/out.raw" 2>&1 >/dev/null | tail -1
 done

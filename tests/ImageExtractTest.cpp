@@ -115,6 +115,39 @@ TEST(ExtractTool, WritesCanonicalSamplesAndPictures) {
     EXPECT_FALSE(std::ifstream(output.path()).good()) << "no output is left behind after a failure";
 }
 
+// Uncompressed images whose stored bytes already are the raw form (whole bytes per sample, one block column,
+// each band's blocks in a row in the file) are copied rather than decoded: whole, as a full-width window of
+// some bands (the last block's padding rows skipped) and through a pipe. A block-interleaved image of several
+// block rows is not in that form and takes the decoding path to the same bytes.
+TEST(ExtractTool, CopiesStoredBytesThatAreAlreadyTheRawForm) {
+    for (char imode : {'S', 'B'}) {
+        SCOPED_TRACE(std::string("IMODE ") + imode);
+        nitfsample::Image image;
+        image.cols = 23;
+        image.rows = 17;
+        image.nppbh = 23;
+        image.nppbv = 8;
+        image.nbpp = 16;
+        image.bands = 3;
+        image.imode = imode;
+        TempFile input(nitfsample::build(fileOf(image)));
+        TempFile output("", ".out");
+        auto rows = [&](int band, int first, int count) {
+            return nitfsample::canonicalBand(image, band).substr(first * 23 * 2, count * 23 * 2);
+        };
+        ASSERT_EQ(runTool("extract " + input.path() + " -f raw -o " + output.path()), 0);
+        EXPECT_EQ(output.read(), rows(0, 0, 17) + rows(1, 0, 17) + rows(2, 0, 17));
+        ASSERT_EQ(runTool("extract " + input.path() + " --window 0,2,23,15 --bands 2,0 -f raw -o " +
+                          output.path()),
+                  0);
+        EXPECT_EQ(output.read(), rows(2, 2, 15) + rows(0, 2, 15));
+        ASSERT_EQ(runTool("extract " + input.path() + " --window 0,9,23,8 --bands 1 -f raw -o - | cat > " +
+                          output.path()),
+                  0);
+        EXPECT_EQ(output.read(), rows(1, 9, 8));
+    }
+}
+
 // A CADRG frame as a picture: its colour table as the palette, absent subframes (the pad pixel, the first
 // code past the 216 colours) transparent.
 TEST(ExtractTool, CadrgFramesAreColouredWithNoDataClear) {

@@ -38,7 +38,23 @@ void writeJpeg(const std::string& path) {
 void writeUncompressed(const std::string& path) {
     nitfsample::Image image = rgbImage();
     image.imode = 'B';
-    image.sample = [](int band, int row, int col) { return static_cast<uint64_t>(row * 3 + col * (band + 1)); };
+    image.sample = [](int band, int row, int col) {
+        return static_cast<uint64_t>(row * 3 + col * (band + 1));
+    };
+    nitfsample::File file;
+    file.images = {image};
+    nitfsample::write(file, path);
+}
+
+// The same samples band-sequential in blocks of whole rows (IMODE S, one block column): stored as the raw
+// form already, band after band.
+void writeUncompressedBandSequential(const std::string& path) {
+    nitfsample::Image image = rgbImage();
+    image.imode = 'S';
+    image.nppbh = kSize;
+    image.sample = [](int band, int row, int col) {
+        return static_cast<uint64_t>(row * 3 + col * (band + 1));
+    };
     nitfsample::File file;
     file.images = {image};
     nitfsample::write(file, path);
@@ -54,5 +70,6 @@ int main(int argc, char** argv) {
     const std::string dir = argv[1];
     writeJpeg(dir + "/jpeg-ycbcr-8192.ntf");
     writeUncompressed(dir + "/nc-rgb-8192.ntf");
+    writeUncompressedBandSequential(dir + "/nc-bsq-8192.ntf");
     return 0;
 }

@@ -9,10 +9,12 @@
 #include <stdexcept>
 #include <thread>
 
+#include <sys/sendfile.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include "HostError.h"
+#include "HostFile.h"
 #include "NitfFileReader.h"
 #include "NitfImageSource.h"
 #include "NitfRegionReader.h"
@@ -99,6 +101,71 @@ void writeAll(int fd, const unsigned char* data, size_t size, off_t offset, bool
     }
 }
 
+// Copies `size` bytes of `in` at `from` to `out` (at `to` when positioned, else at its position): in the
+// kernel where it can, through a buffer where it cannot (another file system, an old kernel).
+void copyRange(int in, off_t from, int out, off_t to, size_t size, bool positioned) {
+    while (size > 0) {
+        const size_t chunk = std::min<size_t>(size, 1u << 30);
+        const ssize_t done =
+            positioned ? copy_file_range(in, &from, out, &to, chunk, 0) : sendfile(out, in, &from, chunk);
+        if (done < 0 && errno == EINTR)
+            continue;
+        if (done <= 0)
+            break;
+        size -= static_cast<size_t>(done);
+    }
+    std::vector<unsigned char> buffer(std::min<size_t>(size, 1u << 20));
+    while (size > 0) {
+        const ssize_t got = pread(in, buffer.data(), std::min(size, buffer.size()), from);
+        if (got < 0 && errno == EINTR)
+            continue;
+        if (got <= 0)
+            throw std::runtime_error(std::string("cannot read the image data: ") +
+                                     (got < 0 ? std::strerror(errno) : "the file ends early"));
+        writeAll(out, buffer.data(), static_cast<size_t>(got), to, positioned);
+        from += got;
+        to += got;
+        size -= static_cast<size_t>(got);
+    }
+}
+
+// Where the stored bytes already are the raw form, the offset of the window's first row in each band: an
+// uncompressed image of whole bytes per sample, without padding columns, whose blocks hold each band's
+// rows one after another in the file. Empty when any block of the window breaks that (or is absent, or
+// runs past the end of the file).
+std::vector<off_t> storedBandStarts(OpenImage& image, const Window& window, const std::vector<int>& bands) {
+    const CNitfImageSource& source = *image.source;
+    const CNitfImagePropertiesIF& p = source.getImageProperties();
+    const auto interleaving = p.getInterleavingType();
+    const bool bandEntries = p.getBandCount() == 1 ||
+                             interleaving == CNitfImagePropertiesIF::eBandSequential ||
+                             interleaving == CNitfImagePropertiesIF::eBandInterleavedByBlock;
+    if (image.region->getLevel() != 0 ||
+        p.getCompressionType() != CNitfImagePropertiesIF::eCompressionUncompressed || p.getBpp() % 8 != 0 ||
+        !bandEntries || p.getTileCountX() != 1 || p.getTileWidth() != p.getImageWidth() ||
+        window.width != p.getImageWidth() || p.getTileHeight() <= 0 ||
+        fileno(image.reader.getInputStream()) < 0)
+        return {};
+    const long long rowBytes = static_cast<long long>(p.getImageWidth()) * (p.getBpp() / 8);
+    const long long blockBytes = rowBytes * p.getTileHeight();
+    const long long fileSize = DKSize(image.reader.getInputStream());
+    const int firstBlock = window.y / p.getTileHeight();
+    const int lastBlock = (window.y + window.height - 1) / p.getTileHeight();
+    std::vector<off_t> starts;
+    for (int band : bands) {
+        const unsigned long long first = source.getTileOffset(p.getTileIndex(0, firstBlock, band));
+        for (int block = firstBlock; block <= lastBlock; ++block) {
+            const unsigned long long offset = source.getTileOffset(p.getTileIndex(0, block, band));
+            if (source.isBlockAbsent(0, block, band) || offset == 0 ||
+                offset != first + static_cast<unsigned long long>(block - firstBlock) * blockBytes ||
+                static_cast<long long>(offset) + blockBytes > fileSize)
+                return {};
+        }
+        starts.push_back(static_cast<off_t>(first + (window.y % p.getTileHeight()) * rowBytes));
+    }
+    return starts;
+}
+
 class Extraction {
 public:
     Extraction(const Request& request, int fd, const Progress& progress)
@@ -121,19 +188,34 @@ public:
 
         struct stat info;
         const bool positioned = fstat(m_fd, &info) == 0 && S_ISREG(info.st_mode);
+        m_base = positioned ? lseek(m_fd, 0, SEEK_CUR) : 0;
+        m_outcome.bytes = static_cast<long long>(m_planeBytes * m_bands.size());
+        const std::vector<off_t> stored = storedBandStarts(first, m_window, m_bands);
+        if (!stored.empty()) {
+            copyStored(first, stored, positioned);
+            return m_outcome;
+        }
         m_pieces =
             cutWindow(*first.region, *first.source, m_window, static_cast<int>(m_bands.size()), !positioned);
-        if (positioned) {
-            m_base = lseek(m_fd, 0, SEEK_CUR);
+        if (positioned)
             runInPlace(first);
-        } else {
+        else
             runStreamed(first);
-        }
-        m_outcome.bytes = static_cast<long long>(m_planeBytes * m_bands.size());
         return m_outcome;
     }
 
 private:
+    // The stored bytes are the output: each band's rows copied from the file as they are, nothing decoded.
+    void copyStored(OpenImage& image, const std::vector<off_t>& starts, bool positioned) {
+        const int in = fileno(image.reader.getInputStream());
+        for (size_t k = 0; k < starts.size(); ++k) {
+            copyRange(in, starts[k], m_fd, m_base + static_cast<off_t>(k * m_planeBytes), m_planeBytes,
+                      positioned);
+            if (m_progress)
+                m_progress(static_cast<long long>(k + 1), static_cast<long long>(starts.size()));
+        }
+    }
+
     // Every band of each piece from one read, each band's rows written at their place in the output.
     void runInPlace(OpenImage& first) {
         const int threads = std::max(1, std::min<int>(m_request.threads, static_cast<int>(m_pieces.size())));
