@@ -12,10 +12,11 @@ command -v hyperfine >/dev/null || { echo "hyperfine is not installed (apt-get i
 gdal=()
 command -v gdal_translate >/dev/null && gdal=(1)
 
+# Each run starts with the previous outputs written back (sync), so that no run pays for another's writes.
 run() { # name, then the commands to compare
     local name=$1; shift
     echo "== $name"
-    hyperfine --warmup 1 --runs "${RUNS:-7}" --style basic "$@" 2>&1 | grep -E "Benchmark|Time|faster than"
+    hyperfine --warmup 1 --runs "${RUNS:-7}" --prepare sync --style basic "$@" 2>&1 | grep -E "Benchmark|Time|faster than"
 }
 
 jpeg=("$nitf extract $work/jpeg-ycbcr-8192.ntf -f raw -o $work/out.raw -j 1"
