@@ -36,11 +36,20 @@ bool hostIsLittleEndian() {
 const long long kFrameTableAllowance = 1 << 20;
 const long long kFrameTableEntriesPerFrame = 64;
 
-// Entry of a frame in its rectangle's frame table: row by row from the north-west corner.
+// Beyond any frame table the allowance lets through: where damaged grids' indexes stop growing.
+const long long kLargestIndex = 1LL << 40;
+
+// Entry of a frame in its rectangle's frame table: row by row from the north-west corner. Grids of up to
+// 2^32 x 2^32 cells fit 64 unsigned bits; a frame outside its grid, or an index past kLargestIndex, gives
+// kLargestIndex, which the frame table check refuses.
 long long frameTableIndex(const CRpfBoundaryRectangleRecord& rectangle,
                           const CRpfFrameFileIndexRecord& frame) {
-    return (static_cast<long long>(rectangle.verticalFrames) - 1 - frame.row) * rectangle.horizontalFrames +
-           frame.column;
+    if (frame.row >= rectangle.verticalFrames || frame.column >= rectangle.horizontalFrames)
+        return kLargestIndex;
+    const unsigned long long rowsBelow = rectangle.verticalFrames - 1ULL - frame.row;
+    const unsigned long long index = rowsBelow * rectangle.horizontalFrames + frame.column;
+    return index > static_cast<unsigned long long>(kLargestIndex) ? kLargestIndex
+                                                                  : static_cast<long long>(index);
 }
 
 // The frame table length of each rectangle: one past its last frame's entry.
@@ -109,10 +118,10 @@ void CRpfSource::readStartAt(FILE* fp, __int64 headerOffset) {
 void CRpfSource::checkFrameTables() const {
     long long total = 0;
     for (long long length : frameTableLengths(m_toc))
-        total += length;
+        total = std::min(total + length, kLargestIndex); // each length is at most kLargestIndex + 1
     const long long allowed = std::max(kFrameTableAllowance, kFrameTableEntriesPerFrame *
                                                                  static_cast<long long>(m_toc.frames.size()));
-    if (total > allowed)
+    if (total >= kLargestIndex || total > allowed)
         NITF_RAISE_FORMAT(
             "void __cdecl CRpfSource::checkFrameTables(void)",
             "The RPF boundary rectangles' frame grids (%lld cells) are far larger than their %zu "
