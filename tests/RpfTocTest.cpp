@@ -205,13 +205,14 @@ TEST(RpfToc, DamagedTablesAreRefusedBeforeTheyAreFollowed) {
         {"a frame of a rectangle that does not exist", frames, 7, 2, "refers to boundary rectangle 7"},
         {"a row outside the grid", frames + 2, 3, 2, "outside the 3 x 2 frames"},
         {"a column outside the grid", frames + 4, 2, 2, "outside the 3 x 2 frames"},
-        {"a grid far larger than its frames", 110 + 124, 60000, 4, "far larger than their 6 frames"}};
+        {"a grid far larger than its frames", 110 + 124, 60000, 4, "far larger than their 6 frames"},
+        {"a grid whose cells overflow 64 bits", 110 + 124, 0xFFFFFFF0, 4, "far larger than their 6 frames"}};
     for (const Case& c : cases) {
         SCOPED_TRACE(c.what);
         std::string bytes = good;
         bytes.replace(c.at, c.width, bigEndian(c.value, c.width));
-        if (std::string(c.what) == "a grid far larger than its frames")
-            bytes.replace(110 + 128, 4, bigEndian(60000, 4));
+        if (c.at == 110 + 124) // the grid cases: as many frames east-west as north-south
+            bytes.replace(110 + 128, 4, bigEndian(c.value, 4));
         const std::string message = readRaw(bytes);
         EXPECT_NE(message.find(c.message), std::string::npos) << message;
     }
