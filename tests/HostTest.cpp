@@ -141,6 +141,29 @@ TEST(HostConfig, MetadataLists) {
     DestroyStringList(list);
 }
 
+TEST(HostConfig, KeyValueFilesFoundUnderNitfHome) {
+    TempDir home;
+    home.write("config/sites.txt",
+               "# comment\n\n  CITY = Oslo \nTIME: 12:00\nno separator\n=no key\ncity=Bergen");
+    const char* saved = std::getenv("NITF_HOME");
+    const std::string savedHome = saved ? saved : "";
+    setenv("NITF_HOME", home.path().c_str(), 1);
+    HostText found(IMPFindFile("config", "sites.txt"));
+    HostText missing(IMPFindFile("config", "absent.txt"));
+    saved ? setenv("NITF_HOME", savedHome.c_str(), 1) : unsetenv("NITF_HOME");
+    ASSERT_TRUE(found);
+    EXPECT_EQ(std::string(found.get()), home.file("config/sites.txt"));
+    EXPECT_FALSE(missing);
+
+    // Keys and values trimmed, the first separator ends the key, a later line of a key replaces it.
+    char** list = TextFileToStringList(found.get());
+    EXPECT_EQ(CountStringList(list), 2);
+    EXPECT_STREQ(FetchAuxEntry(list, "CITY"), "Bergen");
+    EXPECT_STREQ(FetchAuxEntry(list, "TIME"), "12:00");
+    DestroyStringList(list);
+    EXPECT_EQ(TextFileToStringList(home.file("none").c_str()), nullptr);
+}
+
 TEST(HostFile, SizeOfAReadStreamDoesNotGrowBySeeking) {
     TempFile file(std::string(100, 'x'));
     FILE* fp = DKOpen(file.path().c_str(), DK_MODE_READ_BINARY, nullptr);
