@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <atomic>
 #include <cerrno>
+#include <cstdlib>
 #include <cstring>
 #include <memory>
 #include <mutex>
@@ -166,6 +167,26 @@ std::vector<off_t> storedBandStarts(OpenImage& image, const Window& window, cons
     return starts;
 }
 
+// An unlinked file in $TMPDIR (or /tmp) when `wanted`; fd -1 when not wanted or it cannot be made.
+struct ScratchFile {
+    explicit ScratchFile(bool wanted) {
+        if (!wanted)
+            return;
+        const char* dir = std::getenv("TMPDIR");
+        std::string path = std::string(dir && *dir ? dir : "/tmp") + "/nitf-extract-XXXXXX";
+        fd = mkstemp(&path[0]);
+        if (fd >= 0)
+            unlink(path.c_str());
+    }
+    ~ScratchFile() {
+        if (fd >= 0)
+            close(fd);
+    }
+    ScratchFile(const ScratchFile&) = delete;
+    ScratchFile& operator=(const ScratchFile&) = delete;
+    int fd = -1;
+};
+
 class Extraction {
 public:
     Extraction(const Request& request, int fd, const Progress& progress)
@@ -195,12 +216,20 @@ public:
             copyStored(first, stored, positioned);
             return m_outcome;
         }
+        // Several bands to a pipe: streamed band after band, every block holding them all would be decoded
+        // once per band. They are decoded once instead, in place into an unlinked scratch file (threads and
+        // all), then streamed from it.
+        const ScratchFile scratch(!positioned && m_bands.size() > 1);
+        m_out = positioned ? m_fd : scratch.fd;
         m_pieces =
-            cutWindow(*first.region, *first.source, m_window, static_cast<int>(m_bands.size()), !positioned);
-        if (positioned)
-            runInPlace(first);
-        else
+            cutWindow(*first.region, *first.source, m_window, static_cast<int>(m_bands.size()), m_out < 0);
+        if (m_out < 0) {
             runStreamed(first);
+            return m_outcome;
+        }
+        runInPlace(first);
+        if (!positioned)
+            copyRange(scratch.fd, 0, m_fd, 0, static_cast<size_t>(m_outcome.bytes), false);
         return m_outcome;
     }
 
@@ -261,11 +290,11 @@ private:
                                             static_cast<size_t>(piece.top - m_window.y) * m_rowBytes +
                                             static_cast<size_t>(piece.left - m_window.x) * m_sampleBytes);
             if (pieceRow == m_rowBytes) {
-                writeAll(m_fd, plane, piecePlane, start, true);
+                writeAll(m_out, plane, piecePlane, start, true);
                 continue;
             }
             for (int r = 0; r < piece.rows; ++r)
-                writeAll(m_fd, plane + r * pieceRow, pieceRow, start + static_cast<off_t>(r * m_rowBytes),
+                writeAll(m_out, plane + r * pieceRow, pieceRow, start + static_cast<off_t>(r * m_rowBytes),
                          true);
         }
     }
@@ -297,6 +326,7 @@ private:
 
     const Request& m_request;
     int m_fd;
+    int m_out = -1; // where pieces are written in place: the output, or a scratch file
     Progress m_progress;
     Window m_window;
     std::vector<int> m_bands;

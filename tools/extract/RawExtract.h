@@ -37,7 +37,9 @@ using Progress = std::function<void(long long done, long long total)>;
 Window resolveWindow(const Window& window, int width, int height);
 
 // Writes the raw form of the request to `fd`. A regular file is written in place, each piece of the image at
-// its own offset, by `threads` threads; anything else (a pipe) is streamed band after band on this thread.
+// its own offset, by `threads` threads; anything else (a pipe) gets several bands the same way through an
+// unlinked scratch file in $TMPDIR (streamed band after band on this thread when none can be made), one band
+// streamed.
 // Raises vexo::Exception or std::runtime_error when the image cannot be read or the output written.
 Outcome writeRaw(const Request& request, int fd, const Progress& progress = Progress());
 
