@@ -34,24 +34,11 @@ void writeJpeg(const std::string& path) {
     nitfsample::write(file, path);
 }
 
-// The same size uncompressed, band-interleaved by block: 201 MB of samples.
-void writeUncompressed(const std::string& path) {
+// The same size uncompressed (201 MB of samples) in IMODE `imode`, blocks `blockWidth` pixels wide.
+void writeUncompressed(const std::string& path, char imode, int blockWidth) {
     nitfsample::Image image = rgbImage();
-    image.imode = 'B';
-    image.sample = [](int band, int row, int col) {
-        return static_cast<uint64_t>(row * 3 + col * (band + 1));
-    };
-    nitfsample::File file;
-    file.images = {image};
-    nitfsample::write(file, path);
-}
-
-// The same samples band-sequential in blocks of whole rows (IMODE S, one block column): stored as the raw
-// form already, band after band.
-void writeUncompressedBandSequential(const std::string& path) {
-    nitfsample::Image image = rgbImage();
-    image.imode = 'S';
-    image.nppbh = kSize;
+    image.imode = imode;
+    image.nppbh = blockWidth;
     image.sample = [](int band, int row, int col) {
         return static_cast<uint64_t>(row * 3 + col * (band + 1));
     };
@@ -69,7 +56,8 @@ int main(int argc, char** argv) {
     }
     const std::string dir = argv[1];
     writeJpeg(dir + "/jpeg-ycbcr-8192.ntf");
-    writeUncompressed(dir + "/nc-rgb-8192.ntf");
-    writeUncompressedBandSequential(dir + "/nc-bsq-8192.ntf");
+    // Band-interleaved by block, and band-sequential in blocks of whole rows: the raw form already.
+    writeUncompressed(dir + "/nc-rgb-8192.ntf", 'B', kBlock);
+    writeUncompressed(dir + "/nc-bsq-8192.ntf", 'S', kSize);
     return 0;
 }
