@@ -375,29 +375,7 @@ private:
     mutable __int64 m_fileRemaining = -1;
 };
 
-class FileOutput : public Port {
-public:
-    explicit FileOutput(FILE* fp) : m_fp(fp), m_start(DKFTell(fp)) {}
-    size_t take(__int64, const Entry&, const char**) override { return 0; }
-    void put(const char* bytes, size_t width, const Entry&) override {
-        DKFWrite(bytes, 1, width, m_fp);
-        m_count += static_cast<__int64>(width);
-    }
-    __int64 skip(__int64 width) override {
-        DKFSeek64(m_fp, width, SEEK_CUR);
-        m_count += width;
-        return width;
-    }
-    __int64 position() const override { return m_start + m_count; }
-    __int64 consumed() const override { return m_count; }
-    __int64 remaining() const override { return INT64_MAX / 4; }
-
-private:
-    FILE* m_fp;
-    __int64 m_start;
-    __int64 m_count = 0;
-};
-
+// Counts the bytes a walk passes, from `base`: measuring a layout.
 class Counter : public Port {
 public:
     explicit Counter(__int64 base = 0) : m_base(base) {}
@@ -414,6 +392,23 @@ public:
 private:
     __int64 m_base;
     __int64 m_count = 0;
+};
+
+// Writes what it counts to a stream, from the stream's position.
+class FileOutput : public Counter {
+public:
+    explicit FileOutput(FILE* fp) : Counter(DKFTell(fp)), m_fp(fp) {}
+    void put(const char* bytes, size_t width, const Entry& field) override {
+        DKFWrite(bytes, 1, width, m_fp);
+        Counter::put(bytes, width, field);
+    }
+    __int64 skip(__int64 width) override {
+        DKFSeek64(m_fp, width, SEEK_CUR);
+        return Counter::skip(width);
+    }
+
+private:
+    FILE* m_fp;
 };
 
 // Binary records over the serializer family: integers and floating-point values through the typed operators
