@@ -19,6 +19,7 @@
 #include "NitfFileReader.h"
 #include "NitfImageSource.h"
 #include "NitfRegionReader.h"
+#include "ScratchFile.h"
 
 namespace nitfextract {
 
@@ -173,10 +174,7 @@ struct ScratchFile {
         if (!wanted)
             return;
         const char* dir = std::getenv("TMPDIR");
-        std::string path = std::string(dir && *dir ? dir : "/tmp") + "/nitf-extract-XXXXXX";
-        fd = mkstemp(&path[0]);
-        if (fd >= 0)
-            unlink(path.c_str());
+        fd = openUnlinkedFile(dir && *dir ? dir : "/tmp", "nitf-extract-");
     }
     ~ScratchFile() {
         if (fd >= 0)

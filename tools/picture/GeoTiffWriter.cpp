@@ -22,6 +22,8 @@
 #include <tiffio.h>
 #include <xtiffio.h>
 
+#include "ScratchFile.h"
+
 namespace nitfpicture {
 
 int sampleBytes(SampleType type) {
@@ -728,14 +730,12 @@ TiffFile openTiff(const std::string& path, const char* mode) {
 // disappears with its handle whatever happens.
 TiffFile scratchTiff(const std::string& outputPath, bool big) {
     const size_t slash = outputPath.find_last_of('/');
-    std::string pattern =
-        (slash == std::string::npos ? std::string(".") : outputPath.substr(0, slash)) + "/.nitf-level-XXXXXX";
-    const int fd = mkstemp(&pattern[0]);
+    const int fd = nitfextract::openUnlinkedFile(
+        slash == std::string::npos ? std::string(".") : outputPath.substr(0, slash), ".nitf-level-");
     if (fd < 0)
         throw std::runtime_error("cannot create a scratch file beside " + outputPath + ": " +
                                  std::strerror(errno));
-    unlink(pattern.c_str());
-    TiffFile tif(TIFFFdOpen(fd, pattern.c_str(), big ? "w8" : "w"));
+    TiffFile tif(TIFFFdOpen(fd, "scratch level", big ? "w8" : "w"));
     if (!tif) {
         close(fd);
         fail("cannot start a scratch file");
@@ -793,9 +793,11 @@ void writeCloudOptimized(const std::string& path, RowSource& source, const GeoRe
                          const TiffOptions& options, const Plan& plan) {
     const bool big = needsBigTiff(plan, true);
     const int reduced = std::max(0, source.reducedLevels());
-    // Each worker keeps a scratch file per level open: the default stays well within the descriptor limit.
-    const unsigned threads = options.threads > 0 ? static_cast<unsigned>(options.threads)
-                                                 : std::clamp(std::thread::hardware_concurrency(), 1u, 16u);
+    // Each worker keeps a scratch file per level open: at most 16 workers stay well within the descriptor
+    // limit on any machine.
+    const unsigned threads = std::clamp(options.threads > 0 ? static_cast<unsigned>(options.threads)
+                                                            : std::thread::hardware_concurrency(),
+                                        1u, 16u);
     std::vector<std::vector<TiffFile>> scratch(plan.levels.size());
     std::vector<std::vector<TIFF*>> files(plan.levels.size());
     for (size_t k = 0; k < plan.levels.size(); ++k) {

@@ -86,7 +86,7 @@ struct TiffOptions {
     std::vector<unsigned char> palette;
     bool hasNoData = false;
     double noData = 0;
-    // Threads that compress a COG's tiles side by side; 0: one per processor (up to 16). A plain GeoTIFF is
+    // Threads that compress a COG's tiles side by side, at most 16; 0: one per processor. A plain GeoTIFF is
     // written on the calling thread.
     int threads = 0;
     // Told the fraction done, 0 to 1.
