@@ -72,6 +72,20 @@ bool allFinite(const double values[4]) {
     return true;
 }
 
+// Longitudes of an image across the antimeridian (174E to 169W) taken on from the first corner (to 191E), so
+// that positions between the corners step east rather than most of the way round the earth.
+void unwrapLongitudes(const ProjInfo_t& info, const double cornerX[4], double out[4]) {
+    for (int i = 0; i < 4; ++i) {
+        out[i] = cornerX[i];
+        if (info.system == PROJ_GEOGRAPHIC || info.system == PROJ_GEOCENTRIC) {
+            while (out[i] - cornerX[0] > 180)
+                out[i] -= 360;
+            while (out[i] - cornerX[0] < -180)
+                out[i] += 360;
+        }
+    }
+}
+
 } // namespace
 
 void InitProjInfo(ProjInfo_t* info) {
@@ -199,19 +213,9 @@ int ProjSetGeoreferenceFromCorners(ProjInfo_t* info, const double cornerX[4], co
         !allFinite(cornerY))
         return -1;
     enum { UL = 0, UR = 1, LR = 2, LL = 3 }; // NITF corner order
-    // Longitudes of an image across the antimeridian (174E to 169W) are taken on from the first corner
-    // (to 191E), so that the transform steps east rather than most of the way round the earth.
     const double* given = cornerX;
     double unwrapped[4];
-    for (int i = 0; i < 4; ++i) {
-        unwrapped[i] = cornerX[i];
-        if (info->system == PROJ_GEOGRAPHIC || info->system == PROJ_GEOCENTRIC) {
-            while (unwrapped[i] - cornerX[UL] > 180)
-                unwrapped[i] -= 360;
-            while (unwrapped[i] - cornerX[UL] < -180)
-                unwrapped[i] += 360;
-        }
-    }
+    unwrapLongitudes(*info, cornerX, unwrapped);
     cornerX = unwrapped;
     // An image one pixel wide or high has no extent along that axis, so its step there is zero.
     const double lastCol = width - 1, lastRow = height - 1;
@@ -257,9 +261,11 @@ int ProjPixelToMap(const ProjInfo_t* info, double col, double row, double* x, do
         const double u = info->width > 1 ? col / (info->width - 1) : 0;
         const double v = info->height > 1 ? row / (info->height - 1) : 0;
         const double w[4] = {(1 - u) * (1 - v), u * (1 - v), u * v, (1 - u) * v};
+        double cornerX[4];
+        unwrapLongitudes(*info, info->cornerX, cornerX);
         *x = *y = 0;
         for (int i = 0; i < 4; ++i) {
-            *x += w[i] * info->cornerX[i];
+            *x += w[i] * cornerX[i];
             *y += w[i] * info->cornerY[i];
         }
         return 0;

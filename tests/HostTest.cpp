@@ -213,6 +213,16 @@ TEST(HostProjection, CornersGiveAnAffineOnlyForParallelogramsAndPositionsEitherW
     ASSERT_EQ(ProjPixelToMap(&info, 20, 0, &px, &py), 0);
     EXPECT_DOUBLE_EQ(px, 200);
 
+    // Geographic corners across the antimeridian (174E to 169W): between them, positions step east.
+    ProjInfo_t geographic;
+    InitProjInfo(&geographic);
+    geographic.system = PROJ_GEOGRAPHIC;
+    const double lon[4] = {174, -169, -169, 174}, lat[4] = {10, 10, 0, 0};
+    ASSERT_EQ(ProjSetGeoreferenceFromCorners(&geographic, lon, lat, 101, 101), 0);
+    ASSERT_EQ(ProjPixelToMap(&geographic, 50, 50, &px, &py), 0);
+    EXPECT_DOUBLE_EQ(px, 182.5);
+    EXPECT_DOUBLE_EQ(py, 5);
+
     // A record given only a transform uses it.
     ProjInfo_t affine;
     InitProjInfo(&affine);
