@@ -7,10 +7,6 @@
 
 using namespace record;
 
-static Part part(const std::vector<Entry>& entries) {
-    return Part(entries.data(), entries.size());
-}
-
 // Whether the corners (IGEOLO) follow ICORDS: the georeferencing's own rule, so that the two never disagree.
 template <eNitfVersion_t version> static bool hasCorners(const char* icords, size_t length) {
     CNitfGeorefInfo georef;
@@ -100,7 +96,7 @@ static const Entry kTagAreas[] = {
 // clang-format on
 
 const CRecordLayout& imageSubheaderLayout21(eNitfVersion_t version) {
-    static const CRecordLayout nitf({kHead21, kTarget21, part(securityFields21("IS")), kImage, kIfCorners21,
+    static const CRecordLayout nitf({kHead21, kTarget21, Part(securityFields21("IS")), kImage, kIfCorners21,
                                      kCorners, kRateAndBandCount21, kBands, kTagAreas});
     static const CRecordLayout osde(
         {kHead21, kOsde, kImage, kIfCorners21, kCorners, kRateAndBandCount21, kBands, kTagAreas});
@@ -114,13 +110,13 @@ const CRecordLayout& imageSubheaderLayout21(eNitfVersion_t version) {
 }
 
 const CRecordLayout& imageSubheaderLayout20() {
-    static const CRecordLayout layout({kHead20, part(securityFields20("IS")), kImage, kIfCorners20, kCorners,
+    static const CRecordLayout layout({kHead20, Part(securityFields20("IS")), kImage, kIfCorners20, kCorners,
                                        kRateAndBandCount20, kBands, kTagAreas});
     return layout;
 }
 
 const CRecordLayout& imageSubheaderLayout10() {
-    static const CRecordLayout layout({kHead20, part(securityFields20("IS", nullptr, true)), kImage,
+    static const CRecordLayout layout({kHead20, Part(securityFields20("IS", nullptr, true)), kImage,
                                        kIfCorners20, kCorners, kRateAndBandCount20, kBands});
     return layout;
 }

@@ -51,10 +51,6 @@ static bool fieldIs(PropertyMap& map, const char* name, bool (*kind)(const char*
 
 using namespace record;
 
-static Part part(const std::vector<Entry>& entries) {
-    return Part(entries.data(), entries.size());
-}
-
 // clang-format off
 static const Entry kHead20[] = {Text("DE", 2), Text("DESTAG", 25), Text("DESVER", 2)};
 static const Entry kHead21[] = {Text("DE", 2), Text("DESID", 25), Text("DESVER", 2)};
@@ -98,8 +94,8 @@ static const Entry kStreamingTrail[] = {Unsigned("SFH_DELIM2", 4, kTyped), Text(
 // DE, DESID (DESTAG in NITF 2.0), DESVER, the security group of the version, and the fields of the kind.
 static const CRecordLayout& layoutOf(eNitfVersion_t version) {
     // The 2.0 control-and-handling field is kept as "DECTLH"; callers look it up by that name.
-    static const CRecordLayout nitf20({kHead20, part(securityFields20("DES", "DECTLH")), kBody20});
-    static const CRecordLayout nitf21({kHead21, part(securityFields21("DES")), kBody21});
+    static const CRecordLayout nitf20({kHead20, Part(securityFields20("DES", "DECTLH")), kBody20});
+    static const CRecordLayout nitf21({kHead21, Part(securityFields21("DES")), kBody21});
     static const CRecordLayout osde({kHead21, kOsdeSecurity, kBody21});
     static const CRecordLayout other({kHead21, kBody21});
     switch (version) {

@@ -26,8 +26,7 @@ static const CRecordLayout& headLayout() {
         Text("FL", 12), Text("HL", 6),
     };
     // clang-format on
-    const std::vector<Entry>& security = securityFields20("FS");
-    static const CRecordLayout layout({kIdentity, Part(security.data(), security.size()), kTail});
+    static const CRecordLayout layout({kIdentity, Part(securityFields20("FS")), kTail});
     return layout;
 }
 

@@ -17,11 +17,6 @@ static const char kReadSignature[] =
 
 using namespace record;
 
-static Part securityPart21() {
-    const std::vector<Entry>& fields = securityFields21("FS");
-    return Part(fields.data(), fields.size());
-}
-
 // clang-format off
 static const Entry kIdentity[] = {
     Text("FHDR", 9), Text("CLEVEL", 2), Text("STYPE", 4), Text("OSTAID", 10), Text("FDT", 14), Text("FTITLE", 80),
@@ -44,8 +39,10 @@ static const Entry kLengths[] = {
 
 // From FHDR to HL.
 static const CRecordLayout& headLayout(eNitfVersion_t version) {
-    static const CRecordLayout nitf({kIdentity, securityPart21(), kCopies, kOriginator, kLengths});
-    static const CRecordLayout osde({kIdentity, securityPart21(), kCopies, kOsdeOriginator, kLengths});
+    static const CRecordLayout nitf(
+        {kIdentity, Part(securityFields21("FS")), kCopies, kOriginator, kLengths});
+    static const CRecordLayout osde(
+        {kIdentity, Part(securityFields21("FS")), kCopies, kOsdeOriginator, kLengths});
     return version == eOsdeVersion01 ? osde : nitf;
 }
 

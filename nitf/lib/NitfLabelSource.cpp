@@ -21,8 +21,7 @@ static const Entry kTail[] = {
 // clang-format on
 
 void CNitfLabelSource::read(CNitfFile* file, eNitfVersion_t, FILE* fp) {
-    const std::vector<Entry>& security = securityFields20("LS");
-    static const CRecordLayout layout({kHead, Part(security.data(), security.size()), kTail});
+    static const CRecordLayout layout({kHead, Part(securityFields20("LS")), kTail});
     clearContents();
     fp = positionAtSubheader(file, fp);
     // Labels have no TRE source of their own.

@@ -5,10 +5,6 @@
 
 using namespace record;
 
-static Part part(const std::vector<Entry>& entries) {
-    return Part(entries.data(), entries.size());
-}
-
 // clang-format off
 static const Entry kHead[] = {
     Text("SY", 2), Text("SID", 10), Text("SNAME", 20),
@@ -37,8 +33,8 @@ static const Entry kSymbol[] = {
 // clang-format on
 
 void CNitfSymbolSource::read(CNitfFile* file, eNitfVersion_t version, FILE* fp) {
-    static const CRecordLayout graphic({kHead, part(securityFields21("SS")), kGraphic, kExtendedArea});
-    static const CRecordLayout symbol({kHead, part(securityFields20("SS")), kSymbol, kExtendedArea});
+    static const CRecordLayout graphic({kHead, Part(securityFields21("SS")), kGraphic, kExtendedArea});
+    static const CRecordLayout symbol({kHead, Part(securityFields20("SS")), kSymbol, kExtendedArea});
     clearContents();
     fp = positionAtSubheader(file, fp);
     readFields(fp, version == eNitfVersion20 ? symbol : graphic, "SXSHD", CNitfTag::eTagSourceSymbol);

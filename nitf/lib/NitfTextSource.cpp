@@ -8,10 +8,6 @@
 
 using namespace record;
 
-static Part part(const std::vector<Entry>& entries) {
-    return Part(entries.data(), entries.size());
-}
-
 // clang-format off
 static const Entry kHead21[] = {
     Text("TE", 2), Text("TEXTID", 7), Text("TXTALVL", 3), Text("TXTDT", 14), Text("TXTITL", 80),
@@ -30,8 +26,8 @@ static const Entry kTail[] = {
 // clang-format on
 
 void CNitfTextSource::read(CNitfFile* file, eNitfVersion_t version, FILE* fp) {
-    static const CRecordLayout text21({kHead21, part(securityFields21("TS")), kTail});
-    static const CRecordLayout text20({kHead20, part(securityFields20("TS")), kTail});
+    static const CRecordLayout text21({kHead21, Part(securityFields21("TS")), kTail});
+    static const CRecordLayout text20({kHead20, Part(securityFields20("TS")), kTail});
     clearContents();
     fp = positionAtSubheader(file, fp);
     readFields(fp, version == eNitfVersion20 ? text20 : text21, "TXSHD", CNitfTag::eTagSourceText);

@@ -236,6 +236,8 @@ struct Part {
     size_t count;
     template <size_t N> constexpr Part(const Entry (&table)[N]) : entries(table), count(N) {}
     constexpr Part(const Entry* table, size_t n) : entries(table), count(n) {}
+    // A group built at run time (the security fields of a prefix); the vector outlives the layout.
+    Part(const std::vector<Entry>& group) : entries(group.data()), count(group.size()) {}
 };
 
 // Where a field that is not kept (or any field, when asked) lay in the walk.
