@@ -1,9 +1,11 @@
 #include "NitfField.h"
 
+#include <climits>
 #include <cstdint>
 #include <cstring>
 
 #include "NitfProperty.h"
+#include "Raise.h"
 #include "RecordLayout.h"
 
 static std::string hexDigits(const char* bytes, size_t length) {
@@ -18,11 +20,6 @@ static std::string hexDigits(const char* bytes, size_t length) {
     return hex;
 }
 
-// The bytes a value holds as read: a field kept as its bytes holds exactly its width, NULs included.
-static size_t heldLength(const NitfField_t&, CNitfProperty* value) {
-    return value->getStoredLength();
-}
-
 bool nitfFieldNumber(const NitfField_t& field, CNitfProperty* value, double* number, long long* integer,
                      bool* isInteger) {
     if (!value || value->getDataType() == CNitfProperty::eNone || field.form == eFieldText ||
@@ -32,13 +29,13 @@ bool nitfFieldNumber(const NitfField_t& field, CNitfProperty* value, double* num
     if (value->getDataType() != CNitfProperty::eString) {
         // Typed values (a header's binary fields) convert themselves.
         *number = value->getAsDouble();
-        *integer = static_cast<long long>(*number);
+        *integer = nitf_detail::truncateTo<long long>(*number, LLONG_MIN, LLONG_MAX);
         *isInteger =
             value->getDataType() != CNitfProperty::eFloat && value->getDataType() != CNitfProperty::eDouble;
         return true;
     }
     const char* bytes = value->getBytes();
-    size_t length = heldLength(field, value);
+    size_t length = value->getStoredLength();
     if (*isInteger) {
         *integer = recordFieldValue(bytes, length, field.form);
         *number = static_cast<double>(*integer);
@@ -77,11 +74,11 @@ std::string nitfFieldDisplayText(const NitfField_t& field, CNitfProperty* value)
     if (value->getDataType() != CNitfProperty::eString)
         return value->toText(); // eChars as hexadecimal digits, numbers in decimal
     const char* bytes = value->getBytes();
-    size_t length = field.form == eFieldBytes ? heldLength(field, value) : std::strlen(bytes);
+    size_t length = field.form == eFieldBytes ? value->getStoredLength() : std::strlen(bytes);
     bool printable = field.form == eFieldText && CNitfProperty::isBCSA(bytes, static_cast<int>(length)) &&
                      (field.width <= 0 || length == static_cast<size_t>(field.width));
     if (!printable)
-        return hexDigits(bytes, heldLength(field, value));
+        return hexDigits(bytes, value->getStoredLength());
     std::string text(bytes, length);
     text.erase(text.find_last_not_of(' ') + 1);
     return text;

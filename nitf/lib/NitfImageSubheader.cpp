@@ -191,14 +191,6 @@ static int bandValue(PropertyMap& map, const char* name, int band, int count) {
     return value && value->getDataType() != CNitfProperty::eNone ? value->getAsInt() : 0;
 }
 
-static const record::Placed* findPlace(const std::vector<record::Placed>& places, const char* name) {
-    for (const record::Placed& place : places) {
-        if (std::strcmp(place.entry->name, name) == 0)
-            return &place;
-    }
-    return nullptr;
-}
-
 const std::vector<NitfField_t>& CNitfImageSubheader::getFields() const {
     if (!m_fieldsListed && m_readLayout) {
         m_fields.clear();

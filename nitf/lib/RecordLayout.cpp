@@ -633,8 +633,9 @@ public:
           m_byRank(scratch.byRank), m_ranked(scratch.ranked), m_rankCount(layout.rankCount()),
           m_scratch(scratch.bytes) {
         m_spans.assign(static_cast<size_t>(layout.spanCount()), Span());
-        if (report.fields)
-            report.fields->reserve(report.fields->size() + m_nodes.size());
+        // Only a first walk into the list: reserving for each of several would defeat the vector's growth.
+        if (report.fields && report.fields->empty())
+            report.fields->reserve(m_nodes.size());
         m_levels.assign(static_cast<size_t>(layout.maxDepth() + 1), Level());
     }
 
@@ -829,14 +830,14 @@ private:
         return 0;
     }
 
-    // A product beyond the readable bytes makes the field run to their end anyway.
-    __int64 product(__int64 a, __int64 b) const {
+    // Saturates rather than overflows: a width beyond the readable bytes is cut to them when it is read.
+    static __int64 product(__int64 a, __int64 b) {
+        static const __int64 kLargest = INT64_MAX / 4;
         a = std::max<__int64>(0, a);
         b = std::max<__int64>(0, b);
-        __int64 limit = m_port.remaining() + 1;
         if (a == 0 || b == 0)
             return 0;
-        return a > limit / b ? limit : a * b;
+        return a > kLargest / b ? kLargest : a * b;
     }
 
     __int64 repeatCount(const Node& node) const {

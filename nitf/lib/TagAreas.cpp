@@ -4,7 +4,7 @@
 
 #include "HostFile.h"
 
-static const record::Placed* find(const std::vector<record::Placed>& places, const char* name) {
+const record::Placed* findPlace(const std::vector<record::Placed>& places, const char* name) {
     for (const record::Placed& place : places) {
         if (std::strcmp(place.entry->name, name) == 0)
             return &place;
@@ -15,7 +15,7 @@ static const record::Placed* find(const std::vector<record::Placed>& places, con
 void readTagAreas(const std::vector<record::Placed>& places, std::initializer_list<const char*> areas,
                   CNitfTag::eTagSource_t source, std::list<CNitfTag*>& list) {
     for (const char* name : areas) {
-        const record::Placed* area = find(places, name);
+        const record::Placed* area = findPlace(places, name);
         if (area)
             CNitfTag::readArea(area->bytes.data(), static_cast<long long>(area->bytes.size()), area->offset,
                                source, list, true);
@@ -24,7 +24,7 @@ void readTagAreas(const std::vector<record::Placed>& places, std::initializer_li
 
 void writeTagArea(FILE* fp, const std::vector<record::Placed>& places, const char* name,
                   std::list<CNitfTag*>& tags) {
-    const record::Placed* area = find(places, name);
+    const record::Placed* area = findPlace(places, name);
     if (!area || tags.empty())
         return;
     __int64 end = DKFTell(fp);

@@ -11,6 +11,9 @@
 #include "NitfTag.h"
 #include "RecordLayout.h"
 
+// The placed field named `name`, or null.
+const record::Placed* findPlace(const std::vector<record::Placed>& places, const char* name);
+
 // Reads the TREs of every placed field named in `areas` (fields marked kLoaded), in file order, into `list`
 // with `source`, numbered by occurrence.
 void readTagAreas(const std::vector<record::Placed>& places, std::initializer_list<const char*> areas,
