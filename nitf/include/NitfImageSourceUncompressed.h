@@ -48,6 +48,8 @@ private:
                              int tileHeight, int tilesX, int tilesY, long long rowBits, long long rows);
     void buildBitmap(FILE* fp);
     void computeSizes();
+    // The stored size of one block entry.
+    long long entryBytes() const;
     void checkDataPresent();
 
     long long m_tileBandBytes; // one band of one block, as stored

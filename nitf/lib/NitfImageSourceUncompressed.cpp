@@ -61,14 +61,17 @@ void CNitfImageSourceUncompressed::prepareTileOffsets(FILE*, long long dataOffse
                                                       unsigned int* blockMask, int count) {
     if (tileOffsetsFromMask(static_cast<unsigned long long>(dataOffset), blockMask, count))
         return;
-    const int entries = m_tileOffsetCount;
-    // Stored one after the other: band-blocks for IMODE S (the blocks of each band follow the previous
-    // band's), whole blocks otherwise. checkGeometry keeps these products within 2^62.
-    const long long entryBytes = m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandSequential
-                                     ? m_tileBandBytes
-                                     : m_tileBytes;
-    for (int i = 0; i < entries; ++i)
-        m_tileOffsets[i] = dataOffset + i * entryBytes;
+    // Stored one after the other. checkGeometry keeps these products within 2^62.
+    const long long bytes = entryBytes();
+    for (int i = 0; i < m_tileOffsetCount; ++i)
+        m_tileOffsets[i] = dataOffset + i * bytes;
+}
+
+// The stored size of a block entry: band-blocks for IMODE S (the blocks of each band follow the previous
+// band's), whole blocks otherwise.
+long long CNitfImageSourceUncompressed::entryBytes() const {
+    return m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandSequential ? m_tileBandBytes
+                                                                                         : m_tileBytes;
 }
 
 unsigned long long CNitfImageSourceUncompressed::getTileOffset(int x, int y, int band) const {
@@ -110,9 +113,8 @@ void CNitfImageSourceUncompressed::readStart(FILE* fp, long long dataOffset, lon
     CNitfImageSource::readStart(fp, dataOffset, dataLength);
     prepareTileOffsets(fp, dataOffset, dataLength, m_blockMask, m_blockMaskCount);
     dropCachedBlock();
-    if (getBlockLayout() != eBlockBands)
-        checkJustified(m_tileBytes, "block");
-    checkJustified(m_tileBandBytes, "block");
+    // Blocks decoded whole must fit the data; band-blocks are decoded one at a time.
+    checkJustified(getBlockLayout() != eBlockBands ? m_tileBytes : m_tileBandBytes, "block");
     checkDataPresent();
     if (m_properties.getBpp() == 1)
         buildBitmap(fp);
@@ -122,18 +124,14 @@ void CNitfImageSourceUncompressed::readStart(FILE* fp, long long dataOffset, lon
 // warning; far more missing than present comes from damaged geometry, and would only extract zeros.
 void CNitfImageSourceUncompressed::checkDataPresent() {
     const unsigned long long fileEnd = static_cast<unsigned long long>(m_dataOffset + availableData());
-    const long long entryBytes =
-        getBlockLayout() == eBlockBands &&
-                m_properties.getInterleavingType() == CNitfImagePropertiesIF::eBandSequential
-            ? m_tileBandBytes
-            : m_tileBytes;
+    const long long bytes = entryBytes();
     unsigned long long needed = 0, missing = 0;
     for (int i = 0; i < m_tileOffsetCount; ++i) {
         const unsigned long long offset = m_tileOffsets[i];
         if (offset == kAbsentBlock)
             continue;
-        const unsigned long long end = offset + static_cast<unsigned long long>(entryBytes);
-        needed += static_cast<unsigned long long>(entryBytes);
+        const unsigned long long end = offset + static_cast<unsigned long long>(bytes);
+        needed += static_cast<unsigned long long>(bytes);
         if (end > fileEnd)
             missing += end - std::max(offset, fileEnd);
     }

@@ -246,18 +246,23 @@ void CNitfRegionReader::readReduced(int x, int y, int width, int height, const s
     const size_t row = static_cast<size_t>(width) * span * m_sampleBytes;
     const size_t pixelStride = layout == ePixelInterleaved ? bands.size() * m_sampleBytes : m_sampleBytes;
     const size_t rowStride = pixelStride * width;
-    std::vector<unsigned char> decoded(row * height);
+    std::vector<unsigned char> decoded;
     try {
         if (row > static_cast<size_t>(INT32_MAX))
             NITF_RAISE("A reduced-resolution window row is too long",
                        "void __cdecl CNitfRegionReader::readReduced(void)");
+        decoded.resize(row * height);
         m_source->readRegion(m_file, m_level, x, y, width, height, first, span,
                              reinterpret_cast<char*>(decoded.data()), static_cast<int>(row));
     } catch (const vexo::Exception& e) {
         if (result.failedBlocks++ == 0)
             result.firstError = e.what();
     }
-    const bool swap = m_elementBytes > 1 && m_bigEndianOut != kHostBigEndian;
+    if (decoded.empty()) { // not even begun: zeros
+        std::memset(out, 0, getBufferSize(width, height, static_cast<int>(bands.size())));
+        return;
+    }
+    const bool swap = needsSwap();
     for (size_t k = 0; k < bands.size(); ++k) {
         unsigned char* plane =
             out + (layout == ePixelInterleaved ? k * m_sampleBytes : k * rowStride * height);
