@@ -23,10 +23,6 @@ namespace {
 const long long kLeastLineBits = 13;
 const long long kBitmapSlack = 1 << 20;
 
-unsigned char* bytes(char* data) {
-    return reinterpret_cast<unsigned char*>(data);
-}
-
 } // namespace
 
 CNitfImageSourceBilevel::CNitfImageSourceBilevel(CNitfImageSubheader* subheader, char* fileName)
@@ -137,7 +133,7 @@ void CNitfImageSourceBilevel::buildBitmap(FILE* fp) {
     // Each block is decoded straight into its place; in band-sequential images the bitmap is band 0's.
     for (int y = 0; y < tilesY; ++y)
         for (int x = 0; x < tilesX; ++x)
-            decodeInto(fp, m_properties.getTileIndex(x, y), bytes(m_workBuffer),
+            decodeInto(fp, m_properties.getTileIndex(x, y), packedbits::bytes(m_workBuffer),
                        static_cast<uint64_t>(y) * height * rowBits + static_cast<uint64_t>(x) * width,
                        static_cast<uint64_t>(rowBits));
 }
@@ -145,7 +141,20 @@ void CNitfImageSourceBilevel::buildBitmap(FILE* fp) {
 // ---- decoding ---------------------------------------------------------------------------------------------
 
 bool CNitfImageSourceBilevel::decodeBlock(FILE* fp, int entry, int, unsigned char* buffer, int, bool) {
-    const bool read = decodeInto(fp, entry, buffer, 0, static_cast<uint64_t>(m_properties.getTileWidth()));
+    const int width = m_properties.getTileWidth(), height = m_properties.getTileHeight();
+    const int tilesX = m_properties.getTileCountX(), tilesY = m_properties.getTileCountY();
+    bool read;
+    if (m_workBuffer && entry >= 0 && entry < tilesX * tilesY) {
+        // A block of band 0 is in the bitmap already, decoded when the source started.
+        const uint64_t first = static_cast<uint64_t>(entry / tilesX) * height * m_bitmapRowBits +
+                               static_cast<uint64_t>(entry % tilesX) * width;
+        for (int row = 0; row < height; ++row)
+            packedbits::copyBits(buffer, static_cast<uint64_t>(row) * width, packedbits::bytes(m_workBuffer),
+                                 first + static_cast<uint64_t>(row) * m_bitmapRowBits, width);
+        read = true;
+    } else {
+        read = decodeInto(fp, entry, buffer, 0, static_cast<uint64_t>(width));
+    }
     if (read && m_damageNoted[entry])
         noteIncompleteBlock(); // a damaged block is not read whole
     return read;
@@ -191,6 +200,7 @@ void CNitfImageSourceBilevel::noteDamage(int index, int damagedRow, const char* 
 bool CNitfImageSourceBilevel::readBitmap(char* buffer, int x0, int y0, int width, int srcRows,
                                          int outWidthBits, int outRows) {
     // A file whose background is 1 is delivered with background 0.
-    return packedbits::cutBitmap(bytes(m_workBuffer), m_bitmapRowBits, m_bitmapRows, bytes(buffer), x0, y0,
-                                 width, srcRows, outWidthBits, outRows, m_padPixelValue == 1);
+    return packedbits::cutBitmap(packedbits::bytes(m_workBuffer), m_bitmapRowBits, m_bitmapRows,
+                                 packedbits::bytes(buffer), x0, y0, width, srcRows, outWidthBits, outRows,
+                                 m_padPixelValue == 1);
 }
