@@ -19,7 +19,6 @@
 #include "NitfSampleWriter.h"
 #include "TestFiles.h"
 
-
 namespace {
 
 // A page and how to find (or make) its file; the path is empty when the page is not available.
@@ -100,9 +99,10 @@ void wholeProcess(benchmark::State& state, const BenchPage& page, bool gdal) {
     if (gdal && runQuietly({"gdal_translate", "--version"}) != 0)
         return state.SkipWithError("gdal_translate is not installed");
     const TempFile output(std::string(), gdal ? ".envi" : ".raw");
+    // One thread each, as GDAL decodes.
     const std::vector<std::string> command =
         gdal ? std::vector<std::string>{"gdal_translate", "-q", "-of", "ENVI", page.path(), output.path()}
-             : std::vector<std::string>{NITF_TOOL_PATH, "extract",     "-f",       "raw",
+             : std::vector<std::string>{NITF_TOOL_PATH, "extract",     "-f",       "raw", "-j", "1",
                                         "-o",           output.path(), page.path()};
     for (auto _ : state)
         if (runQuietly(command) != 0)
