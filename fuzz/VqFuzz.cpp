@@ -6,6 +6,7 @@
 // read as absent; anything else (a crash, a sanitizer report, another exception, a hang) is a finding.
 #include <cstdint>
 #include <string>
+#include <vector>
 
 #include "NitfSampleWriter.h"
 #include "VqStreams.h"
@@ -43,7 +44,14 @@ nitfsample::Image imageFor(uint8_t shape, const std::string& rest) {
     const int blocks = (shape & 0x20) ? 1 : 2;
     image.cols = blocks * image.nppbh;
     image.rows = blocks * image.nppbv - 1; // a partial last block row
-    const std::string data = (shape & 0x80) ? rest : vqtest::headerAndCodebook(grid) + rest;
+    // Each grid's header and codebook, built once: the 12-bit ones are 64 KiB.
+    static const std::vector<std::string> kHeaders = [] {
+        std::vector<std::string> headers;
+        for (const vqtest::Layout& layout : kGrids)
+            headers.push_back(vqtest::headerAndCodebook(layout));
+        return headers;
+    }();
+    const std::string data = (shape & 0x80) ? rest : kHeaders[shape & 3] + rest;
     if (!masked) {
         image.blockData = {data};
         return image;

@@ -137,9 +137,9 @@ TEST(ExtractTool, CopiesStoredBytesThatAreAlreadyTheRawForm) {
         };
         ASSERT_EQ(runTool("extract " + input.path() + " -f raw -o " + output.path()), 0);
         EXPECT_EQ(output.read(), rows(0, 0, 17) + rows(1, 0, 17) + rows(2, 0, 17));
-        ASSERT_EQ(runTool("extract " + input.path() + " --window 0,2,23,15 --bands 2,0 -f raw -o " +
-                          output.path()),
-                  0);
+        ASSERT_EQ(
+            runTool("extract " + input.path() + " --window 0,2,23,15 --bands 2,0 -f raw -o " + output.path()),
+            0);
         EXPECT_EQ(output.read(), rows(2, 2, 15) + rows(0, 2, 15));
         ASSERT_EQ(runTool("extract " + input.path() + " --window 0,9,23,8 --bands 1 -f raw -o - | cat > " +
                           output.path()),

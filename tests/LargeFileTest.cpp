@@ -42,8 +42,8 @@ TEST(LargeFile, BlocksBeyondFourGigabytesAreRead) {
     ASSERT_GE(fd, 0);
     bool written = ::pwrite(fd, header.data(), header.size(), 0) == static_cast<ssize_t>(header.size()) &&
                    ::ftruncate(fd, headers + blocks * blockBytes) == 0;
-    // The last block (0, 64), wholly beyond 4 GiB, and block (63, 63) across... each filled with its own
-    // byte.
+    // The last two blocks, columns 62 and 63 of block row 64, wholly beyond 4 GiB, each filled with its own
+    // byte: the read below crosses their border.
     std::vector<char> fill(static_cast<size_t>(blockBytes));
     for (long long block : {blocks - 1, blocks - 2}) {
         std::fill(fill.begin(), fill.end(), static_cast<char>(block & 0x7F));

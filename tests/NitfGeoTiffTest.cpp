@@ -58,7 +58,7 @@ CRpcSource modelOf(std::vector<nitfsample::Tre> tres) {
     return model ? *model : CRpcSource();
 }
 
-std::string joined(const std::vector<std::string>& lines) {
+std::string asLines(const std::vector<std::string>& lines) {
     std::string text;
     for (const std::string& line : lines)
         text += line + "\n";
@@ -97,8 +97,8 @@ TEST(GeorefReport, TextAndJsonOfEachKindOfImage) {
     EXPECT_EQ(nitfgeoref::reportJson(none), nlohmann::json({{"icords", " "}, {"coordinate_type", "none"}}));
 
     // The text says the same for people.
-    const std::string text = joined(nitfgeoref::reportLines(g)) + joined(nitfgeoref::reportLines(n)) +
-                             joined(nitfgeoref::reportLines(skew)) + joined(nitfgeoref::reportLines(none));
+    const std::string text = asLines(nitfgeoref::reportLines(g)) + asLines(nitfgeoref::reportLines(n)) +
+                             asLines(nitfgeoref::reportLines(skew)) + asLines(nitfgeoref::reportLines(none));
     for (const char* line :
          {"Coordinates: ICORDS \"G\" (geographic), corners from IGEOLO\n",
           "corner 3 (last row, last column, row 100, column 200): -20.00000000, +20.00000000\n",
