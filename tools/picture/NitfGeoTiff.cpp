@@ -2,8 +2,9 @@
 
 #include <cmath>
 #include <cstdint>
-#include <cstring>
 #include <algorithm>
+#include <cstring>
+#include <memory>
 #include <stdexcept>
 
 #include "NitfRegionReader.h"
@@ -16,14 +17,19 @@ namespace nitfpicture {
 
 namespace {
 
+// What a strip of rows may hold: a block row, unless that is larger and the source can read parts of blocks.
+const size_t kStripBudget = 64u << 20;
+
 // Rows of the image through the region reader, pixel-interleaved as the file holds them. Rows are read a
-// block row at a time (a block is decoded once however the writer asks for its rows) and kept until the
-// writer has taken them; reduced levels come from the source where it has them.
+// strip at a time (a block row, so that a block is decoded once however the writer asks for its rows, or less
+// where blocks are large and can be read in part) and kept until the writer has taken them; reduced levels
+// come from the source where it has them.
 class RegionRows : public RowSource {
 public:
     RegionRows(CNitfFile& file, CNitfImageSource& source, std::vector<int> bands)
         : m_file(file), m_source(source), m_bands(std::move(bands)), m_region(&file, &source) {
-        m_stripHeight = source.getImageProperties().getTileHeight();
+        m_stripHeight =
+            m_region.getRowsPerRead(m_region.getWidth(), static_cast<int>(m_bands.size()), kStripBudget);
     }
 
     RasterFormat format() const override {
@@ -41,10 +47,12 @@ public:
     void readRows(int level, int first, int count, void* buffer) override {
         unsigned char* out = static_cast<unsigned char*>(buffer);
         if (level > 0) {
-            CNitfRegionReader reduced(&m_file, &m_source);
-            reduced.setLevel(level);
-            check(reduced.read(0, first, reduced.getWidth(), count, m_bands, out,
-                               CNitfRegionReader::ePixelInterleaved));
+            if (!m_reduced || m_reduced->getLevel() != level) {
+                m_reduced.reset(new CNitfRegionReader(&m_file, &m_source));
+                m_reduced->setLevel(level);
+            }
+            check(m_reduced->read(0, first, m_reduced->getWidth(), count, m_bands, out,
+                                  CNitfRegionReader::ePixelInterleaved));
             return;
         }
         const size_t row = m_region.getBufferSize(m_region.getWidth(), 1, static_cast<int>(m_bands.size()));
@@ -77,6 +85,7 @@ private:
     CNitfImageSource& m_source;
     std::vector<int> m_bands;
     CNitfRegionReader m_region;
+    std::unique_ptr<CNitfRegionReader> m_reduced; // of the reduced level last read
     int m_stripHeight = 1, m_stripTop = 0, m_stripRows = 0;
     std::vector<unsigned char> m_strip;
 };
