@@ -218,13 +218,11 @@ int runExtract(int argc, char** argv) {
                          {"compress", required_argument, nullptr, kCompress}},
                         "i:b:f:o:j:");
     Options options;
-    std::string problem;
     const int status = parser.parse(argc, argv, [&](int code, const char* value) {
         try {
             takeOption(code, value, options);
             return true;
         } catch (const UsageError& e) {
-            problem = e.what();
             std::fprintf(stderr, "nitf extract: %s\n", e.what());
             return false;
         }

@@ -28,8 +28,7 @@ void printHelp(const Command& command, FILE* out) {
 }
 
 Options::Options(const Command& command, std::vector<option> longOptions, const char* shortOptions)
-    : m_command(command), m_long(std::move(longOptions)), m_short(std::string("h") + shortOptions) {
-    m_long.push_back({"help", no_argument, nullptr, 'h'});
+    : m_command(command), m_long(std::move(longOptions)), m_short(shortOptions) {
     m_long.push_back({nullptr, 0, nullptr, 0});
 }
 
@@ -72,11 +71,6 @@ WarningsOnStderr::WarningsOnStderr(const char* command, const std::string& file)
 
 WarningsOnStderr::~WarningsOnStderr() {
     vexo::nspio::Warning::setHandler(m_previous);
-}
-
-int WarningsOnStderr::count() const {
-    std::lock_guard<std::mutex> lock(m_mutex);
-    return static_cast<int>(m_seen.size());
 }
 
 } // namespace cli

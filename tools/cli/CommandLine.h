@@ -32,7 +32,7 @@ void printHelp(const Command& command, FILE* out);
 
 // A command's options, parsed with getopt_long. `handle` is called with each option's value (or null) and
 // returns false to refuse it; the operands are what is left. Returns -1 to go on, or the exit status when the
-// command must stop (2 after a usage error, 0 after --help).
+// command must stop (2 after a usage error). --help is answered before any command parses (see nitf.cpp).
 class Options {
 public:
     Options(const Command& command, std::vector<option> longOptions, const char* shortOptions);
@@ -43,10 +43,6 @@ public:
         int count = static_cast<int>(m_arguments.size());
         char** args = m_arguments.data();
         for (int code; (code = next(count, args)) != -1;) {
-            if (code == 'h') {
-                printHelp(m_command, stdout);
-                return 0;
-            }
             if (code == '?' || !handle(code, optarg))
                 return usageError(nullptr);
         }
@@ -73,7 +69,7 @@ private:
 void reportError(const char* command, const std::string& file, const std::string& message);
 
 // While it lives, the library's warnings go to stderr as "nitf CMD: FILE: warning: message", each once
-// (several decoding threads meet the same causes), and are counted.
+// (several decoding threads meet the same causes).
 class WarningsOnStderr {
 public:
     WarningsOnStderr(const char* command, const std::string& file);
@@ -81,11 +77,9 @@ public:
     WarningsOnStderr(const WarningsOnStderr&) = delete;
     WarningsOnStderr& operator=(const WarningsOnStderr&) = delete;
 
-    int count() const;
-
 private:
     vexo::nspio::Warning::Handler m_previous;
-    mutable std::mutex m_mutex;
+    std::mutex m_mutex;
     std::set<std::string> m_seen;
 };
 

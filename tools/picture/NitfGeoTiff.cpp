@@ -17,6 +17,12 @@ namespace nitfpicture {
 
 namespace {
 
+// The writer's sample types are the region reader's, in the same order: one is cast to the other.
+static_assert(static_cast<int>(SampleType::UInt8) == CNitfRegionReader::eUInt8 &&
+                  static_cast<int>(SampleType::Int64) == CNitfRegionReader::eInt64 &&
+                  static_cast<int>(SampleType::ComplexFloat64) == CNitfRegionReader::eComplexFloat64,
+              "sample types out of step");
+
 // What a strip of rows may hold: a block row, unless that is larger and the source can read parts of blocks.
 const size_t kStripBudget = 64u << 20;
 
