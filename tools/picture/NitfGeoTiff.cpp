@@ -10,7 +10,7 @@
 #include "NitfRegionReader.h"
 #include "NitfFile.h"
 #include "NitfImageSource.h"
-#include "NitfLutSource.h"
+#include "BandLut.h"
 #include "RpcSource.h"
 
 namespace nitfpicture {
@@ -102,23 +102,15 @@ namespace {
 
 // The colour map of band `band` (RGB triplets; a one-table grey LUT repeated into three), or empty.
 std::vector<unsigned char> paletteOf(CNitfFile& file, CNitfImageSource& source, int band) {
-    for (int i = 0; i < source.getLutCount(); ++i) {
-        CNitfLutSource* lut = source.getLutSource(i);
-        if (!lut || lut->getBand() != band + 1 || lut->getSize() <= 0)
-            continue;
-        const int components = lut->getEntrySize();
-        if (components != 1 && components != 3)
-            return {};
-        std::vector<unsigned char> entries(static_cast<size_t>(lut->getSize()));
-        lut->readInterleaved(&file, reinterpret_cast<char*>(entries.data()), lut->getSize());
-        if (components == 3)
-            return entries;
-        std::vector<unsigned char> grey;
-        for (unsigned char level : entries)
-            grey.insert(grey.end(), {level, level, level});
-        return grey;
-    }
-    return {};
+    BandLut lut = readBandLut(file, source, band);
+    if (lut.components == 3)
+        return lut.entries;
+    if (lut.components != 1)
+        return {};
+    std::vector<unsigned char> grey;
+    for (unsigned char level : lut.entries)
+        grey.insert(grey.end(), {level, level, level});
+    return grey;
 }
 
 } // namespace

@@ -10,10 +10,10 @@
 #include <stdexcept>
 #include <string>
 
+#include "BandLut.h"
 #include "NitfFileReader.h"
 #include "NitfImageSource.h"
 #include "NitfImageSubheader.h"
-#include "NitfLutSource.h"
 #include "NitfRegionReader.h"
 #include "PictureWriter.h"
 
@@ -83,16 +83,10 @@ double sampleValue(const unsigned char* p, int bytes, CNitfImagePropertiesIF::eP
 
 // The look-up table of band `band`, entry-interleaved.
 bool readLut(CNitfFileReader& reader, CNitfImageSource& source, int band, View& view) {
-    for (int i = 0; i < source.getLutCount(); ++i) {
-        CNitfLutSource* lut = source.getLutSource(i);
-        if (!lut || lut->getBand() != band + 1 || lut->getSize() <= 0)
-            continue;
-        view.tableComponents = lut->getEntrySize();
-        view.table.assign(static_cast<size_t>(lut->getSize()), 0);
-        lut->readInterleaved(&reader, reinterpret_cast<char*>(view.table.data()), lut->getSize());
-        return true;
-    }
-    return false;
+    nitfpicture::BandLut lut = nitfpicture::readBandLut(reader, source, band);
+    view.tableComponents = lut.components;
+    view.table = std::move(lut.entries);
+    return view.tableComponents > 0;
 }
 
 View chooseView(CNitfFileReader& reader, CNitfImageSource& source, const std::vector<int>& chosen) {
