@@ -1,9 +1,11 @@
 // nitf toc: the RPF table of contents of an A.TOC file (raw or NITF-wrapped) with its boundary rectangles and
 // their frames, and whether each frame file is there beside it; or the RPF description of a frame file. As
 // text or as one JSON object.
+#include <cctype>
 #include <cstdio>
 #include <cstring>
 #include <filesystem>
+#include <map>
 #include <memory>
 #include <nlohmann/json.hpp>
 #include <stdexcept>
@@ -29,31 +31,54 @@ struct StreamCloser {
     void operator()(FILE* fp) const { DKClose(fp); }
 };
 
-// The file a path relative to `directory` names, each component matched without regard to case when it is not
-// there as written (tables store upper-case names; files on disk are often lower case). Empty when missing.
-std::string findFile(const fs::path& directory, const std::string& relative) {
-    fs::path found = directory;
-    std::error_code error;
-    for (const fs::path& part : fs::path(relative)) {
-        if (part == "." || part.empty())
-            continue;
-        if (fs::exists(found / part, error)) {
-            found /= part;
-            continue;
-        }
-        bool matched = false;
-        for (const fs::directory_entry& entry : fs::directory_iterator(found, error)) {
-            if (strcasecmp(entry.path().filename().c_str(), part.c_str()) == 0) {
-                found = entry.path();
-                matched = true;
-                break;
+// Files named by paths relative to a directory, each component matched as written or else without regard to
+// case (tables store upper-case names; files on disk are often lower case). Each directory is listed once,
+// however many frames of the table lie in it.
+class FileFinder {
+public:
+    explicit FileFinder(fs::path directory) : m_directory(std::move(directory)) {}
+
+    // The file `relative` names, or empty when it is missing.
+    std::string find(const std::string& relative) {
+        fs::path found = m_directory;
+        std::error_code error;
+        for (const fs::path& part : fs::path(relative)) {
+            if (part == "." || part.empty())
+                continue;
+            if (fs::exists(found / part, error)) {
+                found /= part;
+                continue;
             }
+            const std::map<std::string, fs::path>& names = listing(found);
+            const auto match = names.find(lowered(part.string()));
+            if (match == names.end())
+                return std::string();
+            found /= match->second;
         }
-        if (!matched)
-            return std::string();
+        return fs::is_regular_file(found, error) ? found.string() : std::string();
     }
-    return fs::is_regular_file(found, error) ? found.string() : std::string();
-}
+
+private:
+    static std::string lowered(std::string text) {
+        for (char& c : text)
+            c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+        return text;
+    }
+
+    // The entries of `directory` by their lower-case names (the first of names that differ only in case).
+    const std::map<std::string, fs::path>& listing(const fs::path& directory) {
+        const auto [place, added] = m_listings.try_emplace(directory.string());
+        if (added) {
+            std::error_code error;
+            for (const fs::directory_entry& entry : fs::directory_iterator(directory, error))
+                place->second.emplace(lowered(entry.path().filename().string()), entry.path().filename());
+        }
+        return place->second;
+    }
+
+    fs::path m_directory;
+    std::map<std::string, std::map<std::string, fs::path>> m_listings;
+};
 
 struct Description {
     std::vector<std::string> lines;
@@ -62,7 +87,7 @@ struct Description {
 
 Description describeToc(CRpfSource& toc, const std::string& path, const char* form) {
     Description out;
-    const fs::path directory = fs::path(path).parent_path();
+    FileFinder files(fs::path(path).parent_path());
     const nitf::CRpfHeaderSection& header = toc.getToc().header;
     out.json["file"] = path;
     out.json["form"] = form;
@@ -108,7 +133,7 @@ Description describeToc(CRpfSource& toc, const std::string& path, const char* fo
             // Rows count from the south, as the table stores them.
             const unsigned row = r.verticalFrames - 1 - static_cast<unsigned>(i) / r.horizontalFrames;
             const unsigned column = static_cast<unsigned>(i) % r.horizontalFrames;
-            const std::string onDisk = findFile(directory, r.frameFiles[i]);
+            const std::string onDisk = files.find(r.frameFiles[i]);
             ++listed;
             present += onDisk.empty() ? 0 : 1;
             frames.push_back({{"row", row},
