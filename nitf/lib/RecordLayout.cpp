@@ -253,7 +253,13 @@ public:
         }
         m_scratch->busy = true;
     }
-    ~ScratchLease() { m_scratch->busy = false; }
+    ~ScratchLease() {
+        // The thread keeps its scratch from walk to walk, but not the buffer of an unusually large record.
+        static const size_t kKeptInput = 1 << 20;
+        if (m_scratch->input.capacity() > kKeptInput)
+            std::vector<char>().swap(m_scratch->input);
+        m_scratch->busy = false;
+    }
     ScratchLease(const ScratchLease&) = delete;
     ScratchLease& operator=(const ScratchLease&) = delete;
     Scratch& operator*() const { return *m_scratch; }
